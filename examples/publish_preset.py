@@ -1,0 +1,141 @@
+#!/usr/bin/env python2.7
+"""Publishes an adjustment preset to the community service, with a progress bar.
+
+Signs in, lists the preset categories, makes a preset file and twelve preview
+images on the spot, and uploads them. Ctrl-C cancels the upload.
+
+    publish_preset.py [--account NAME] [--password PW] [--preset-mb N]
+"""
+import argparse
+import os
+import shutil
+import struct
+import sys
+import tempfile
+import time
+import zlib
+
+from PyUploader import OBLoginData, PyPresetUploader
+
+VERSION = u"5.0"
+VERSION_TYPE = u"Retail"
+MACHINE_ID = u"7f3c2a10-demo-0000-0000-000000000001"
+BAR_WIDTH = 40
+
+
+def png_bytes(width, height):
+    """A valid RGB PNG of noise: stored uncompressed, so its size is predictable."""
+    def chunk(kind, data):
+        body = kind + data
+        return struct.pack(">I", len(data)) + body + struct.pack(">I", zlib.crc32(body) & 0xFFFFFFFF)
+    rows = b"".join(b"\x00" + os.urandom(width * 3) for _ in range(height))
+    header = struct.pack(">IIBBBBB", width, height, 8, 2, 0, 0, 0)
+    return (b"\x89PNG\r\n\x1a\n" + chunk(b"IHDR", header)
+            + chunk(b"IDAT", zlib.compress(rows, 0)) + chunk(b"IEND", b""))
+
+
+def make_preset(folder, preset_mb):
+    """Writes a preset file and twelve images; returns their paths."""
+    preset = os.path.join(folder, u"Golden hour.preset")
+    with open(preset, "wb") as f:
+        f.write(b'<?xml version="1.0" encoding="utf-8"?>\n<preset name="Golden hour">\n'
+                b'  <exposure>0.35</exposure><contrast>12</contrast><warmth>18</warmth>\n'
+                b'</preset>\n')
+        f.write(b"\n" * (preset_mb * 1024 * 1024))
+    images = []
+    for number in range(1, 13):
+        path = os.path.join(folder, u"preview_%02d.png" % number)
+        with open(path, "wb") as f:
+            f.write(png_bytes(320, 320))
+        images.append(path)
+    return preset, images
+
+
+class ProgressReport(object):
+    """Receives the uploader's reports on this (the main) thread."""
+
+    def __init__(self):
+        self.done = False
+        self.success = False
+        self.url = u""
+        self.error = u""
+
+    def __call__(self, kind, event, percent, *rest):
+        if event == u"ProgressChanged":
+            self.draw(percent, rest[0])
+        elif event == u"UploadComplete":
+            self.done = True
+            self.success, self.url, self.error = bool(rest[0]), rest[1], rest[2]
+            self.draw(percent, 0)
+            sys.stdout.write("\n")
+
+    @staticmethod
+    def draw(percent, half_seconds_left):
+        filled = BAR_WIDTH * max(0, min(percent, 100)) // 100
+        sys.stdout.write("\r[%s%s] %3d%%  about %ds left for this file "
+                         % ("#" * filled, "." * (BAR_WIDTH - filled), percent,
+                            (half_seconds_left + 1) // 2))
+        sys.stdout.flush()
+
+
+def sign_in(args):
+    session = OBLoginData(VERSION, VERSION_TYPE, MACHINE_ID)
+    if not session.LoginOrbishare(args.account.decode("utf-8"), args.password.decode("utf-8")):
+        sys.exit("Sign-in failed: check the account and the service.")
+    print(u"Signed in as %s on %s" % (session.GetUserName(), session.GetServerUrl()))
+    return session
+
+
+def choose_category(session):
+    categories = session.GetPresetCategory(u"ENU") or {}
+    for category_id in sorted(categories, key=lambda k: int(k) if k.isdigit() else k):
+        print(u"  category %s: %s" % (category_id, categories[category_id]))
+    return sorted(categories)[0] if categories else u""
+
+
+def wait_for(report, uploader):
+    """Runs Python on the main thread until the completion report has arrived."""
+    cancelled = False
+    while not report.done:
+        try:
+            time.sleep(0.05)  # reports are delivered between Python instructions
+        except KeyboardInterrupt:
+            if not cancelled:
+                cancelled = True
+                sys.stdout.write("\nCancelling...\n")
+                uploader.CancelUpload()
+
+
+def main():
+    parser = argparse.ArgumentParser(description=__doc__.splitlines()[0])
+    parser.add_argument("--account", default="demo@example.org")
+    parser.add_argument("--password", default="s3cret & more")
+    parser.add_argument("--preset-mb", type=int, default=64,
+                        help="padding of the preset file, so the progress is worth watching")
+    args = parser.parse_args()
+
+    session = sign_in(args)
+    category = choose_category(session)
+    folder = tempfile.mkdtemp(prefix="preset-")
+    try:
+        preset, images = make_preset(folder, args.preset_mb)
+        uploader = PyPresetUploader(session.GetServerUrl(), session.GetLoginTokenID(),
+                                    VERSION, VERSION_TYPE, MACHINE_ID)
+        report = ProgressReport()
+        uploader.SetCallback(report)
+        if not uploader.StartUpload(preset, images, u"golden-hour", u"Golden hour",
+                                    category, u"warm,sunset", u"Soft warm light for evenings"):
+            sys.exit("The upload could not be started.")
+        wait_for(report, uploader)
+    finally:
+        shutil.rmtree(folder, ignore_errors=True)
+
+    if report.success:
+        print(u"Published: %s" % report.url)
+        return 0
+    print(u"Not published%s" % (u": " + report.error if report.error else u" (cancelled or failed)"))
+    return 1
+
+
+if __name__ == "__main__":
+    sys.exit(main())
