@@ -1,0 +1,71 @@
+// The client session of the community service: server host, the signed-in
+// member's token and details, the service links, the preset categories and the
+// state of the reachability probe. Operations run on the caller's thread with the
+// interpreter lock held; only the token may be read from another thread.
+#pragma once
+
+#include <cstddef>
+#include <map>
+#include <mutex>
+#include <string>
+
+#include "service/ServiceHosts.h"
+
+struct _object;
+typedef struct _object PyObject;
+
+typedef void* HINTERNET;  // a connection handle of the reachability probe
+typedef int BOOL;
+
+inline constexpr std::size_t kMaxPath = 260;
+
+class OBLoginData {
+ public:
+  // Null arguments are taken as empty texts.
+  OBLoginData(const wchar_t* version, const wchar_t* versionType, const wchar_t* uuid);
+  ~OBLoginData();  // sends nothing to the service
+  OBLoginData(const OBLoginData&) = delete;
+  OBLoginData& operator=(const OBLoginData&) = delete;
+
+  // Accessors for Python: each returns a new unicode object (or the count).
+  PyObject* GetUserName() const;
+  PyObject* GetServerUrl() const;
+  PyObject* GetLoginTokenID() const;
+  int GetCategoryCount() const;
+
+  // For the service operations: the token is read and written only under m_csToken.
+  std::wstring GetToken() const;
+  void SetLoginTokenID(const std::wstring& token);
+  void SetUserName(const std::wstring& name);
+  void SetProfileURL(const std::wstring& link);
+
+  // Service operations: each is defined in its own file of src/service/ and
+  // declared here.
+
+  // The reachability probe's state, also read and written from Python.
+  HINTERNET m_hInternet;
+  HINTERNET m_hConnect;
+  HINTERNET m_hRequest;  // no operation uses it
+  BOOL m_bServerReachable;
+  char m_szChkServerUrl[kMaxPath];  // may hold kMaxPath bytes without a terminator
+
+ private:
+  std::wstring DefaultLink(const wchar_t* path) const;
+
+  BOOL m_bLoggedIn;
+  std::wstring m_strServerUrl;  // bare host name of every service request
+  std::wstring m_strProfileURL;
+  std::wstring m_strUserName;
+  std::wstring m_strLoginTokenID;  // guarded by m_csToken
+  std::wstring m_strVersion;
+  std::wstring m_strVersionType;
+  std::wstring m_strAdjustmentPresetURL;
+  std::wstring m_strSignUpURL;
+  std::wstring m_strForgetPasswordURL;
+  std::wstring m_strLensCorrectionURL;
+  std::wstring m_strVideoGalleryURL;
+  std::wstring m_strUuid;
+  std::map<std::wstring, std::wstring> m_mapCategory;  // decimal category id to name
+  mutable std::mutex m_csToken;
+  const ServiceHosts m_hosts;
+};

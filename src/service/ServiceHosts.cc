@@ -1,0 +1,19 @@
+#include "service/ServiceHosts.h"
+
+#include <cstdlib>
+
+#include "platform/text.h"
+
+namespace {
+
+std::wstring Setting(const char* variable, const wchar_t* fallback) {
+  const char* value = std::getenv(variable);
+  return value && *value ? text::Utf8ToWide(value) : fallback;
+}
+
+}  // namespace
+
+ServiceHosts ServiceHosts::FromEnvironment() {
+  return ServiceHosts{Setting(kDefaultHostVariable, kDefaultHost), Setting(kStagingHostVariable, kStagingHost),
+                      Setting(kDetectionHostVariable, kDetectionHost)};
+}

@@ -1,0 +1,8 @@
+#include <Python.h>
+
+#include "upload/InterpreterLockHeld.h"
+
+bool InterpreterLockHeld() {
+  PyThreadState* mine = PyGILState_GetThisThreadState();
+  return mine != nullptr && mine == _PyThreadState_Current;
+}
