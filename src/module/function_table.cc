@@ -1,0 +1,111 @@
+// The 45 module functions at their positions. Each function is one statement in the
+// functions_<Class>.cc of its class, built on binding::Call (runtime/call.h), which
+// runs the shared call sequence: unpack exactly N arguments, convert them left to
+// right (raising the module's error texts), call the native operation, convert its
+// result. To add one:
+//
+// 1. Define it in functions_<Class>.cc (using namespace binding), for example
+//
+//    // Unicode argument, passed-through result (the operation returns a new PyObject*):
+//    PyObject* OBLoginData_GetPresetCategory(PyObject*, PyObject* args) {
+//      return Call(args, "OBLoginData_GetPresetCategory", PassedThrough{},
+//                  [](OBLoginData* self, const wchar_t* language) {
+//                    return self->GetPresetCategory(language);
+//                  },
+//                  Pointer<OBLoginData>(Type(TypeId::OBLoginData), "OBLoginData *"), Unicode());
+//    }
+//
+//    // Integer argument, a by-reference CString (null refused), int result:
+//    PyObject* OBLoginData_GetCategroyName(PyObject*, PyObject* args) {
+//      return Call(args, "OBLoginData_GetCategroyName", ReturnsInt{},
+//                  [](OBLoginData* self, int id, CString& name) {
+//                    return self->GetCategroyName(id, name);
+//                  },
+//                  Pointer<OBLoginData>(Type(TypeId::OBLoginData), "OBLoginData *"),
+//                  Integer("int"), Reference<CString>(Type(TypeId::CString), "CString &"));
+//    }
+//
+//    Argument kinds (runtime/argument_kinds.h), each naming the C type of its error text:
+//      Pointer<T>(type, "T *")                  null object refused with ValueError
+//      Pointer<T>(type, "T *", OnNull::kSkipCall) setters: None object returns None
+//      Reference<T>(type, "CString" | "CString &" | "HINTERNET")  T&, null refused
+//      Unicode()            const wchar_t*, the unicode object's own buffer
+//      WideString()         const wchar_t*, a copy freed after the call (None: null)
+//      Integer("int" | "BOOL")                  int
+//      NarrowArray<260>("char [_MAX_PATH]")     const std::array<char, 260>&
+//      Object()             PyObject*, borrowed
+//    Result kinds (runtime/result_kinds.h): ReturnsNone{}, ReturnsInt{},
+//      ReturnsUnsigned{}, PassedThrough{}, ReturnsStr{} (the operation returns a
+//      std::string_view of the whole array), NewPointer(type, flags): POINTER_OWN |
+//      POINTER_NOSHADOW for constructors, POINTER_OWN for getters of CString and
+//      HINTERNET members (the operation returns a new heap copy).
+//    Delete<T>(args, name, type, "T *") and Register(args, type) are the whole body of
+//    the delete_ and _swigregister functions.
+// 2. Declare it in functions_<Class>.h.
+// 3. Replace its numbered slot comment below with its entry.
+#include "module/function_table.h"
+
+#include "module/functions_infoEffectURL.h"
+
+namespace module {
+
+namespace {
+
+constexpr PyMethodDef Entry(const char* name, PyCFunction function) {
+  return PyMethodDef{name, function, METH_VARARGS, nullptr};
+}
+
+PyMethodDef g_functions[] = {
+    Entry("new_infoEffectURL", new_infoEffectURL),                      // 1
+    Entry("infoEffectURL_strEffect_set", infoEffectURL_strEffect_set),  // 2
+    Entry("infoEffectURL_strEffect_get", infoEffectURL_strEffect_get),  // 3
+    Entry("infoEffectURL_strTag_set", infoEffectURL_strTag_set),        // 4
+    Entry("infoEffectURL_strTag_get", infoEffectURL_strTag_get),        // 5
+    Entry("infoEffectURL_strURL_set", infoEffectURL_strURL_set),        // 6
+    Entry("infoEffectURL_strURL_get", infoEffectURL_strURL_get),        // 7
+    Entry("delete_infoEffectURL", delete_infoEffectURL),                // 8
+    Entry("infoEffectURL_swigregister", infoEffectURL_swigregister),    // 9
+    // 10 new_OBLoginData
+    // 11 delete_OBLoginData
+    // 12 OBLoginData_LoginOrbishare
+    // 13 OBLoginData_LogoutOrbishare
+    // 14 OBLoginData_InitOBServerURL
+    // 15 OBLoginData_SetOBURLAsReg
+    // 16 OBLoginData_GetUserName
+    // 17 OBLoginData_GetServerUrl
+    // 18 OBLoginData_GetLoginTokenID
+    // 19 OBLoginData_GetSignUpURL
+    // 20 OBLoginData_GetForgetPasswordURL
+    // 21 OBLoginData_GetLensCorrectionURL
+    // 22 OBLoginData_GetPresetCategory
+    // 23 OBLoginData_GetCategroyName
+    // 24 OBLoginData_GetCategoryCount
+    // 25 OBLoginData_SetRelateVideo
+    // 26 OBLoginData_GetPresetDownloadURL
+    // 27 OBLoginData_GetEffectByGUID
+    // 28 OBLoginData_m_hInternet_set
+    // 29 OBLoginData_m_hInternet_get
+    // 30 OBLoginData_m_hConnect_set
+    // 31 OBLoginData_m_hConnect_get
+    // 32 OBLoginData_m_hRequest_set
+    // 33 OBLoginData_m_hRequest_get
+    // 34 OBLoginData_m_bServerReachable_set
+    // 35 OBLoginData_m_bServerReachable_get
+    // 36 OBLoginData_m_szChkServerUrl_set
+    // 37 OBLoginData_m_szChkServerUrl_get
+    // 38 OBLoginData_swigregister
+    // 39 new_PyPresetUploader
+    // 40 delete_PyPresetUploader
+    // 41 PyPresetUploader_SetCallback
+    // 42 PyPresetUploader_StartUpload
+    // 43 PyPresetUploader_CancelUpload
+    // 44 PyPresetUploader_GetUploadedFileUrl
+    // 45 PyPresetUploader_swigregister
+    {nullptr, nullptr, 0, nullptr},
+};
+
+}  // namespace
+
+PyMethodDef* FunctionTable() { return g_functions; }
+
+}  // namespace module

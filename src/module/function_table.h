@@ -1,0 +1,11 @@
+// The module's function table, in the order Python's callers know it.
+#pragma once
+
+#include <Python.h>
+
+namespace module {
+
+// The null-terminated table handed to Py_InitModule4; static storage.
+PyMethodDef* FunctionTable();
+
+}  // namespace module

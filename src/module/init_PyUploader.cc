@@ -1,0 +1,26 @@
+// The module's entry point, the only symbol the library exports.
+#include <Python.h>
+
+#include "module/function_table.h"
+#include "module/runtime/TypeTable.h"
+#include "module/types.h"
+#include "platform/http_global.h"
+
+namespace {
+
+constexpr char kModuleName[] = "_PyUploader";
+constexpr int kApiVersion = 1013;
+
+}  // namespace
+
+extern "C" __attribute__((visibility("default"))) void init_PyUploader() {
+  // What loading the library sets up: the HTTP library, and the interpreter lock for
+  // the worker and probe threads.
+  http::GlobalInit();
+  PyEval_InitThreads();
+
+  PyObject* module =
+      Py_InitModule4(kModuleName, module::FunctionTable(), nullptr, nullptr, kApiVersion);
+  if (!module) return;  // the module defines no constants
+  binding::InitializeTypeTable(module::ModuleTypeTable());
+}

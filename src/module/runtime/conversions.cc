@@ -1,0 +1,138 @@
+#include "module/runtime/conversions.h"
+
+#include <climits>
+#include <cstring>
+
+#include "module/runtime/PyRef.h"
+#include "module/runtime/TypeTable.h"
+#include "module/runtime/pointers.h"
+#include "module/runtime/status.h"
+
+namespace binding {
+
+namespace {
+
+constexpr uint32_t kLargestInt = 0x7FFFFFFF;
+
+static_assert(sizeof(Py_UNICODE) == sizeof(wchar_t),
+              "unicode characters cross into wide strings unconverted");
+
+TypeInfo* WideCharType() {
+  static TypeInfo* type = TypeQuery("_p_wchar_t");
+  return type;
+}
+
+TypeInfo* CharType() {
+  static TypeInfo* type = TypeQuery("_p_char");
+  return type;
+}
+
+wchar_t* CopyUnicode(PyObject* text) {
+  Py_ssize_t count = PyUnicode_GET_SIZE(text);
+  auto* copy = new wchar_t[count + 1];
+  std::memcpy(copy, PyUnicode_AS_UNICODE(text), count * sizeof(wchar_t));
+  copy[count] = L'\0';
+  return copy;
+}
+
+template <typename T>
+void Store(T* out, T value) {
+  if (out) *out = value;
+}
+
+bool InIntRange(long value) { return value >= INT_MIN && value <= INT_MAX; }
+
+}  // namespace
+
+int AsWideString(PyObject* object, wchar_t** address, size_t*, int* mark) {
+  PyRef decoded;
+  if (PyString_Check(object)) {
+    decoded = PyRef(PyUnicode_FromObject(object));
+    if (!decoded) return STATUS_TYPE_ERROR;
+    object = decoded.get();
+  }
+  if (PyUnicode_Check(object)) {
+    wchar_t* copy = CopyUnicode(object);
+    if (address) {
+      *address = copy;
+    } else {
+      delete[] copy;
+    }
+    Store(mark, NEWOBJ);
+    return STATUS_OK;
+  }
+  void* pointer = nullptr;
+  if (ConvertPointer(object, &pointer, WideCharType(), 0) != STATUS_OK) return STATUS_TYPE_ERROR;
+  Store(address, static_cast<wchar_t*>(pointer));
+  return STATUS_OK;
+}
+
+int AsNarrowString(PyObject* object, char** address, size_t* length, int* mark) {
+  if (PyString_Check(object)) {
+    char* bytes = PyString_AS_STRING(object);
+    size_t count = PyString_GET_SIZE(object) + 1;
+    if (mark && *mark == NEWOBJ && address) {
+      *address = new char[count];
+      std::memcpy(*address, bytes, count);
+    } else {
+      Store(address, bytes);
+      Store(mark, 0);
+    }
+    Store(length, count);
+    return STATUS_OK;
+  }
+  void* pointer = nullptr;
+  if (ConvertPointer(object, &pointer, CharType(), 0) != STATUS_OK) return STATUS_TYPE_ERROR;
+  auto* text = static_cast<char*>(pointer);
+  Store(address, text);
+  Store(length, text ? std::strlen(text) + 1 : size_t{0});
+  Store(mark, 0);
+  return STATUS_OK;
+}
+
+int AsNarrowArray(PyObject* object, char* buffer, size_t size) {
+  char* text = nullptr;
+  size_t count = 0;
+  int mark = 0;
+  if (AsNarrowString(object, &text, &count, &mark) != STATUS_OK) return STATUS_TYPE_ERROR;
+  if (count == size + 1 && text[size] == '\0') count = size;
+  if (count > size) return STATUS_TYPE_ERROR;
+  if (count) std::memcpy(buffer, text, count);
+  std::memset(buffer + count, 0, size - count);
+  return STATUS_OK;
+}
+
+int AsInt(PyObject* object, int* value) {
+  long number = 0;
+  if (PyInt_Check(object)) {
+    number = PyInt_AS_LONG(object);
+  } else if (PyLong_Check(object)) {
+    number = PyLong_AsLong(object);
+    if (number == -1 && PyErr_Occurred()) {
+      PyErr_Clear();
+      return STATUS_TYPE_ERROR;
+    }
+  } else {
+    return STATUS_TYPE_ERROR;
+  }
+  // The platform's C long is wider than the 32-bit value the native side takes.
+  if (!InIntRange(number)) return STATUS_TYPE_ERROR;
+  Store(value, static_cast<int>(number));
+  return STATUS_OK;
+}
+
+PyObject* FromNarrowArray(const char* bytes, size_t size) {
+  return PyString_FromStringAndSize(bytes, static_cast<Py_ssize_t>(size));
+}
+
+size_t TrimTrailingZeros(const char* bytes, size_t size) {
+  while (size > 0 && bytes[size - 1] == '\0') --size;
+  return size;
+}
+
+PyObject* FromUnsigned(uint32_t value) {
+  if (value <= kLargestInt) return PyInt_FromLong(static_cast<long>(value));
+  return PyLong_FromUnsignedLong(value);
+}
+
+}  // namespace binding

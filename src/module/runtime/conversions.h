@@ -1,0 +1,40 @@
+// Conversions of module function arguments and results. The argument conversions
+// return STATUS_OK or STATUS_TYPE_ERROR and leave no Python error set, except that a
+// `str` the default encoding cannot decode keeps the interpreter's decoding error.
+// Every out-parameter may be null.
+#pragma once
+
+#include <Python.h>
+
+#include <cstddef>
+#include <cstdint>
+
+namespace binding {
+
+// 'wchar_t const *': a `unicode` or `str` is copied into a new zero-terminated array
+// (free it with delete[]) and the mark becomes NEWOBJ; a "wchar_t *" pointer object or
+// None gives the pointed-to string itself (mark 0). The length is not computed.
+int AsWideString(PyObject* object, wchar_t** address, size_t* length, int* mark);
+
+// A `str` gives its own buffer, or a new[] copy when *mark is NEWOBJ on entry; a
+// "char *" pointer object or None gives the pointed-to string. The length counts the
+// terminating zero (0 for null).
+int AsNarrowString(PyObject* object, char** address, size_t* length, int* mark);
+
+// 'char [N]': at most `size` bytes (a terminating zero beyond them is dropped), the
+// rest of `buffer` filled with zeros; None gives an all-zero buffer.
+int AsNarrowArray(PyObject* object, char* buffer, size_t size);
+
+// 'int', 'BOOL': an `int`, `bool` or `long` within the signed 32-bit range.
+int AsInt(PyObject* object, int* value);
+
+// A `str` of exactly `size` bytes.
+PyObject* FromNarrowArray(const char* bytes, size_t size);
+
+// The length of `bytes` without its trailing zero bytes.
+size_t TrimTrailingZeros(const char* bytes, size_t size);
+
+// An `int` below 0x80000000, a `long` from there on.
+PyObject* FromUnsigned(uint32_t value);
+
+}  // namespace binding

@@ -1,0 +1,14 @@
+#include "platform/http_global.h"
+
+#include <curl/curl.h>
+
+#include <mutex>
+
+namespace http {
+
+void GlobalInit() {
+  static std::once_flag once;
+  std::call_once(once, [] { curl_global_init(CURL_GLOBAL_DEFAULT); });
+}
+
+}  // namespace http
