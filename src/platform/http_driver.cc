@@ -1,0 +1,88 @@
+#include "platform/http_driver.h"
+
+namespace http {
+namespace {
+
+// Long enough to cost nothing; short enough that a cancel flag set without a
+// wake-up is seen promptly.
+constexpr int kPollMilliseconds = 50;
+constexpr long kConnectTimeoutSeconds = 60;
+// A transfer that moves no byte for this long is given up (a paused body is exempt).
+constexpr long kStallSeconds = 60;
+
+}  // namespace
+
+Driver::Driver() : multi_(curl_multi_init()), easy_(curl_easy_init()) {}
+
+Driver::~Driver() {
+  if (attached_) curl_multi_remove_handle(multi_.get(), easy_.get());
+  easy_.reset();
+  multi_.reset();
+}
+
+bool Driver::SetCommonOptions(const std::string& url, const std::string& agent) {
+  CURL* e = easy_.get();
+  bool ok = curl_easy_setopt(e, CURLOPT_URL, url.c_str()) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_PROTOCOLS_STR, "http,https") == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_PATH_AS_IS, 1L) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_HTTP_VERSION, CURL_HTTP_VERSION_1_1) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_NOSIGNAL, 1L) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_SSL_VERIFYPEER, 1L) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_SSL_VERIFYHOST, 2L) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_CONNECTTIMEOUT, kConnectTimeoutSeconds) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_LOW_SPEED_LIMIT, 1L) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_LOW_SPEED_TIME, kStallSeconds) == CURLE_OK;
+  if (ok && !agent.empty()) ok = curl_easy_setopt(e, CURLOPT_USERAGENT, agent.c_str()) == CURLE_OK;
+  return ok;
+}
+
+win::Status Driver::Begin() {
+  if (curl_multi_add_handle(multi_.get(), easy_.get()) != CURLM_OK) {
+    return win::StatusFromWin32(win::kErrorInternetInternalError);
+  }
+  attached_ = true;
+  return win::kOk;
+}
+
+void Driver::Run(const std::function<bool()>& until, const std::atomic<bool>* cancelled) {
+  for (;;) {
+    if (!Perform() || finished_ || until()) return;
+    if (cancelled && cancelled->load()) return;
+    if (!Poll()) return;
+  }
+}
+
+void Driver::Wakeup() { curl_multi_wakeup(multi_.get()); }
+
+win::Status Driver::result() const {
+  return win::StatusFromWin32(win::Win32FromCurl(code_));
+}
+
+// Lets libcurl do what it can without waiting.
+bool Driver::Perform() {
+  int running = 0;
+  if (curl_multi_perform(multi_.get(), &running) != CURLM_OK) {
+    finished_ = true;
+    code_ = CURLE_OUT_OF_MEMORY;
+    return false;
+  }
+  CollectFinished();
+  return true;
+}
+
+// Waits for the network, one of libcurl's timers or a wake-up.
+bool Driver::Poll() {
+  return curl_multi_poll(multi_.get(), nullptr, 0, kPollMilliseconds, nullptr) == CURLM_OK;
+}
+
+void Driver::CollectFinished() {
+  int left = 0;
+  while (CURLMsg* message = curl_multi_info_read(multi_.get(), &left)) {
+    if (message->msg == CURLMSG_DONE && message->easy_handle == easy_.get()) {
+      finished_ = true;
+      code_ = message->data.result;
+    }
+  }
+}
+
+}  // namespace http

@@ -1,0 +1,29 @@
+// The connection notifications of an HTTP request, raised on the thread that
+// drives the request, inside the call that is running.
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+namespace http {
+
+class ConnectionEvents {
+ public:
+  virtual void OnResolvingName(const std::string& host) = 0;
+  virtual void OnNameResolved(const std::string& address) = 0;
+  virtual void OnConnectingToServer(const std::string& address) = 0;
+  virtual void OnConnectedToServer(const std::string& address) = 0;
+  virtual void OnSendingRequest() = 0;
+  // The request head and body have gone out; `bytes` counts both.
+  virtual void OnRequestSent(std::uint32_t bytes) = 0;
+  virtual void OnReceivingResponse() = 0;
+  // The reply head has arrived; `bytes` counts its lines.
+  virtual void OnResponseReceived(std::uint32_t bytes) = 0;
+  virtual void OnClosingConnection() = 0;
+  virtual void OnConnectionClosed() = 0;
+
+ protected:
+  ~ConnectionEvents() = default;
+};
+
+}  // namespace http

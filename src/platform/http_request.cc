@@ -1,0 +1,171 @@
+#include <cctype>
+#include <string>
+
+#include "platform/http.h"
+#include "platform/http_body_feeder.h"
+#include "platform/http_driver.h"
+#include "platform/http_event_relay.h"
+#include "platform/http_reply_reader.h"
+
+namespace http {
+namespace {
+
+constexpr std::string_view kPost = "POST";
+
+win::Status Fail(std::uint32_t code) { return win::StatusFromWin32(code); }
+
+std::string_view NameOf(std::string_view line) { return line.substr(0, line.find(':')); }
+
+bool IsContentType(std::string_view line) {
+  constexpr std::string_view kName = "content-type";
+  const std::string_view name = NameOf(line);
+  if (name.size() != kName.size()) return false;
+  for (std::size_t i = 0; i < name.size(); ++i) {
+    if (std::tolower(static_cast<unsigned char>(name[i])) != kName[i]) return false;
+  }
+  return true;
+}
+
+}  // namespace
+
+// Declared in this order so that the transfer is released before the reader,
+// feeder and relay its callbacks point at.
+class Request::State {
+ public:
+  State(const Connection& connection, std::string verb, std::string path)
+      : verb_(std::move(verb)),
+        url_(connection.UrlOf(path)),
+        agent_(connection.session().agent()),
+        relay_(connection.session().events(), connection.host()),
+        reader_(&relay_) {}
+
+  win::Status AddHeaders(std::string_view block);
+  win::Status Start(std::uint64_t content_length);
+  win::Status Write(std::string_view piece);
+  win::Status End();
+
+  const ReplyReader& reader() const { return reader_; }
+
+ private:
+  bool is_post() const { return verb_ == kPost; }
+  bool Configure(std::uint64_t content_length);
+  bool AddHeaderLine(const std::string& line);
+  // What a transfer that stopped early reports.
+  win::Status Stopped() const;
+
+  std::string verb_;
+  std::string url_;
+  std::string agent_;
+  EventRelay relay_;
+  ReplyReader reader_;
+  BodyFeeder feeder_;
+  curl::List headers_;
+  bool names_content_type_ = false;
+  bool started_ = false;
+  std::uint64_t announced_ = 0;
+  Driver driver_;
+};
+
+win::Status Request::State::AddHeaders(std::string_view block) {
+  if (started_) return Fail(win::kErrorInvalidParameter);
+  while (!block.empty()) {
+    const std::size_t end = block.find('\n');
+    std::string line(block.substr(0, end));
+    block = end == std::string_view::npos ? std::string_view() : block.substr(end + 1);
+    if (!line.empty() && line.back() == '\r') line.pop_back();
+    if (line.empty()) continue;
+    if (!AddHeaderLine(line)) return Fail(win::kErrorNotEnoughMemory);
+    names_content_type_ = names_content_type_ || IsContentType(line);
+  }
+  return win::kOk;
+}
+
+win::Status Request::State::Start(std::uint64_t content_length) {
+  if (started_ || (!is_post() && content_length != 0)) return Fail(win::kErrorInvalidParameter);
+  started_ = true;
+  announced_ = content_length;
+  if (!driver_.ok() || !Configure(content_length)) return Fail(win::kErrorNotEnoughMemory);
+  const win::Status begun = driver_.Begin();
+  if (win::Failed(begun) || content_length == 0) return begun;
+  // Run until libcurl has connected, sent the head and asks for the body.
+  driver_.Run([this] { return feeder_.waiting(); });
+  return driver_.finished() && win::Failed(driver_.result()) ? driver_.result() : win::kOk;
+}
+
+win::Status Request::State::Write(std::string_view piece) {
+  if (!started_ || !is_post() || feeder_.handed_over() + piece.size() > announced_) {
+    return Fail(win::kErrorInvalidParameter);
+  }
+  if (piece.empty()) return win::kOk;
+  feeder_.Offer(piece);
+  feeder_.Resume(driver_.easy());
+  driver_.Run([this] {
+    return feeder_.taken() && (feeder_.waiting() || feeder_.handed_over() == announced_);
+  });
+  return feeder_.taken() ? win::kOk : Stopped();
+}
+
+win::Status Request::State::End() {
+  if (!started_) {
+    const win::Status started = Start(0);
+    if (win::Failed(started)) return started;
+  }
+  feeder_.Finish();
+  feeder_.Resume(driver_.easy());
+  driver_.Run([] { return false; });
+  return driver_.finished() ? driver_.result() : Stopped();
+}
+
+bool Request::State::Configure(std::uint64_t content_length) {
+  CURL* easy = driver_.easy();
+  bool ok = driver_.SetCommonOptions(url_, agent_) && relay_.Install(easy) &&
+            reader_.Install(easy);
+  // libcurl's own defaults that the system never sends.
+  ok = ok && AddHeaderLine("Expect:") && AddHeaderLine("Accept:");
+  if (is_post()) {
+    ok = ok && feeder_.Install(easy) &&
+         curl_easy_setopt(easy, CURLOPT_POST, 1L) == CURLE_OK &&
+         curl_easy_setopt(easy, CURLOPT_POSTFIELDSIZE_LARGE,
+                          static_cast<curl_off_t>(content_length)) == CURLE_OK;
+    if (!names_content_type_) ok = ok && AddHeaderLine("Content-Type:");
+  } else {
+    ok = ok && curl_easy_setopt(easy, CURLOPT_HTTPGET, 1L) == CURLE_OK;
+  }
+  return ok && curl_easy_setopt(easy, CURLOPT_HTTPHEADER, headers_.get()) == CURLE_OK;
+}
+
+bool Request::State::AddHeaderLine(const std::string& line) {
+  return curl::Append(headers_, line.c_str());
+}
+
+win::Status Request::State::Stopped() const {
+  if (driver_.finished() && win::Failed(driver_.result())) return driver_.result();
+  return Fail(win::kErrorInternetConnectionAborted);
+}
+
+Request::Request(const Connection& connection, std::string verb, std::string path)
+    : state_(std::make_unique<State>(connection, std::move(verb), std::move(path))) {}
+
+Request::~Request() = default;
+
+win::Status Request::AddHeaders(std::string_view block) { return state_->AddHeaders(block); }
+win::Status Request::Start(std::uint64_t content_length) { return state_->Start(content_length); }
+win::Status Request::Write(std::string_view piece) { return state_->Write(piece); }
+win::Status Request::End() { return state_->End(); }
+
+win::Status Request::Send(std::string_view body) {
+  win::Status status = Start(body.size());
+  if (!win::Failed(status) && !body.empty()) status = Write(body);
+  if (!win::Failed(status)) status = End();
+  return status;
+}
+
+std::uint32_t Request::status_code() const { return state_->reader().status_code(); }
+
+std::string Request::HeaderValue(std::string_view name) const {
+  return state_->reader().HeaderValue(name);
+}
+
+const std::string& Request::body() const { return state_->reader().body(); }
+
+}  // namespace http

@@ -1,0 +1,62 @@
+#include "platform/url.h"
+
+#include <cstdlib>
+
+#include "platform/curl_handles.h"
+
+namespace url {
+namespace {
+
+// Reads one part; a part the URL lacks reads as empty text.
+bool GetPart(CURLU* handle, CURLUPart part, unsigned flags, std::string* out) {
+  char* raw = nullptr;
+  const CURLUcode code = curl_url_get(handle, part, &raw, flags);
+  const curl::Text owned(raw);
+  if (code == CURLUE_OK) {
+    *out = raw;
+    return true;
+  }
+  out->clear();
+  return code == CURLUE_NO_USER || code == CURLUE_NO_PASSWORD;
+}
+
+bool Fits(const std::string& component) { return component.size() < kComponentCapacity; }
+
+bool AllFit(const Components& c) {
+  return Fits(c.scheme) && Fits(c.host) && Fits(c.user) && Fits(c.password) && Fits(c.path) &&
+         Fits(c.extra);
+}
+
+}  // namespace
+
+bool Split(std::string_view text, Components* components) {
+  if (text.find('\0') != std::string_view::npos) return false;
+  // Only absolute URLs with an authority: "scheme://host...".
+  const std::size_t colon = text.find(':');
+  if (colon == std::string_view::npos || text.substr(colon + 1, 2) != "//") return false;
+  const curl::Url handle(curl_url());
+  if (!handle) return false;
+  const std::string whole(text);
+  // Paths go out as written: no dot-segment folding, no re-escaping.
+  if (curl_url_set(handle.get(), CURLUPART_URL, whole.c_str(), CURLU_PATH_AS_IS) != CURLUE_OK) {
+    return false;
+  }
+  Components parts;
+  parts.scheme = std::string(text.substr(0, colon));
+  std::string port;
+  if (!GetPart(handle.get(), CURLUPART_HOST, 0, &parts.host) ||
+      !GetPart(handle.get(), CURLUPART_USER, 0, &parts.user) ||
+      !GetPart(handle.get(), CURLUPART_PASSWORD, 0, &parts.password) ||
+      !GetPart(handle.get(), CURLUPART_PORT, CURLU_DEFAULT_PORT, &port) ||
+      !GetPart(handle.get(), CURLUPART_PATH, 0, &parts.path)) {
+    return false;
+  }
+  parts.port = static_cast<unsigned>(std::strtoul(port.c_str(), nullptr, 10));
+  const std::size_t extra = text.find_first_of("?#");
+  if (extra != std::string_view::npos) parts.extra = std::string(text.substr(extra));
+  if (!AllFit(parts)) return false;
+  *components = std::move(parts);
+  return true;
+}
+
+}  // namespace url
