@@ -45,6 +45,7 @@
 // 3. Replace its numbered slot comment below with its entry.
 #include "module/function_table.h"
 
+#include "module/functions_OBLoginData.h"
 #include "module/functions_infoEffectURL.h"
 
 namespace module {
@@ -65,35 +66,35 @@ PyMethodDef g_functions[] = {
     Entry("infoEffectURL_strURL_get", infoEffectURL_strURL_get),        // 7
     Entry("delete_infoEffectURL", delete_infoEffectURL),                // 8
     Entry("infoEffectURL_swigregister", infoEffectURL_swigregister),    // 9
-    // 10 new_OBLoginData
-    // 11 delete_OBLoginData
+    Entry("new_OBLoginData", new_OBLoginData),  // 10
+    Entry("delete_OBLoginData", delete_OBLoginData),  // 11
     // 12 OBLoginData_LoginOrbishare
     // 13 OBLoginData_LogoutOrbishare
     // 14 OBLoginData_InitOBServerURL
     // 15 OBLoginData_SetOBURLAsReg
-    // 16 OBLoginData_GetUserName
-    // 17 OBLoginData_GetServerUrl
-    // 18 OBLoginData_GetLoginTokenID
+    Entry("OBLoginData_GetUserName", OBLoginData_GetUserName),  // 16
+    Entry("OBLoginData_GetServerUrl", OBLoginData_GetServerUrl),  // 17
+    Entry("OBLoginData_GetLoginTokenID", OBLoginData_GetLoginTokenID),  // 18
     // 19 OBLoginData_GetSignUpURL
     // 20 OBLoginData_GetForgetPasswordURL
     // 21 OBLoginData_GetLensCorrectionURL
     // 22 OBLoginData_GetPresetCategory
     // 23 OBLoginData_GetCategroyName
-    // 24 OBLoginData_GetCategoryCount
+    Entry("OBLoginData_GetCategoryCount", OBLoginData_GetCategoryCount),  // 24
     // 25 OBLoginData_SetRelateVideo
     // 26 OBLoginData_GetPresetDownloadURL
     // 27 OBLoginData_GetEffectByGUID
-    // 28 OBLoginData_m_hInternet_set
-    // 29 OBLoginData_m_hInternet_get
-    // 30 OBLoginData_m_hConnect_set
-    // 31 OBLoginData_m_hConnect_get
-    // 32 OBLoginData_m_hRequest_set
-    // 33 OBLoginData_m_hRequest_get
-    // 34 OBLoginData_m_bServerReachable_set
-    // 35 OBLoginData_m_bServerReachable_get
-    // 36 OBLoginData_m_szChkServerUrl_set
-    // 37 OBLoginData_m_szChkServerUrl_get
-    // 38 OBLoginData_swigregister
+    Entry("OBLoginData_m_hInternet_set", OBLoginData_m_hInternet_set),  // 28
+    Entry("OBLoginData_m_hInternet_get", OBLoginData_m_hInternet_get),  // 29
+    Entry("OBLoginData_m_hConnect_set", OBLoginData_m_hConnect_set),  // 30
+    Entry("OBLoginData_m_hConnect_get", OBLoginData_m_hConnect_get),  // 31
+    Entry("OBLoginData_m_hRequest_set", OBLoginData_m_hRequest_set),  // 32
+    Entry("OBLoginData_m_hRequest_get", OBLoginData_m_hRequest_get),  // 33
+    Entry("OBLoginData_m_bServerReachable_set", OBLoginData_m_bServerReachable_set),  // 34
+    Entry("OBLoginData_m_bServerReachable_get", OBLoginData_m_bServerReachable_get),  // 35
+    Entry("OBLoginData_m_szChkServerUrl_set", OBLoginData_m_szChkServerUrl_set),  // 36
+    Entry("OBLoginData_m_szChkServerUrl_get", OBLoginData_m_szChkServerUrl_get),  // 37
+    Entry("OBLoginData_swigregister", OBLoginData_swigregister),  // 38
     // 39 new_PyPresetUploader
     // 40 delete_PyPresetUploader
     // 41 PyPresetUploader_SetCallback

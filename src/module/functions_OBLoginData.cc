@@ -1,0 +1,126 @@
+#include "module/functions_OBLoginData.h"
+
+#include <algorithm>
+#include <array>
+#include <string_view>
+
+#include "module/runtime/call.h"
+#include "module/types.h"
+#include "service/OBLoginData.h"
+
+namespace module {
+
+namespace {
+
+using namespace binding;
+
+using HandleMember = HINTERNET OBLoginData::*;
+using UrlBuffer = std::array<char, kMaxPath>;
+
+constexpr char kSessionType[] = "OBLoginData *";
+
+PointerKind<OBLoginData> Session(OnNull onNull = OnNull::kRefuse) {
+  return Pointer<OBLoginData>(Type(TypeId::OBLoginData), kSessionType, onNull);
+}
+
+PyObject* SetHandle(PyObject* args, const char* function, HandleMember member) {
+  return Call(args, function, ReturnsNone{},
+              [member](OBLoginData* self, HINTERNET handle) { self->*member = handle; },
+              Session(OnNull::kSkipCall), Reference<HINTERNET>(Type(TypeId::HINTERNET), "HINTERNET"));
+}
+
+// A new heap cell holding the handle, owned by the pointer object returned.
+PyObject* GetHandle(PyObject* args, const char* function, HandleMember member) {
+  return Call(args, function, NewPointer(Type(TypeId::HINTERNET), POINTER_OWN),
+              [member](OBLoginData* self) { return new HINTERNET(self->*member); }, Session());
+}
+
+}  // namespace
+
+PyObject* new_OBLoginData(PyObject*, PyObject* args) {
+  return Call(args, "new_OBLoginData", NewPointer(Type(TypeId::OBLoginData), POINTER_OWN | POINTER_NOSHADOW),
+              [](const wchar_t* version, const wchar_t* versionType, const wchar_t* uuid) {
+                return new OBLoginData(version, versionType, uuid);
+              },
+              Unicode(), Unicode(), Unicode());
+}
+
+PyObject* delete_OBLoginData(PyObject*, PyObject* args) {
+  return Delete<OBLoginData>(args, "delete_OBLoginData", Type(TypeId::OBLoginData), kSessionType);
+}
+
+PyObject* OBLoginData_GetUserName(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_GetUserName", PassedThrough{},
+              [](OBLoginData* self) { return self->GetUserName(); }, Session());
+}
+
+PyObject* OBLoginData_GetServerUrl(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_GetServerUrl", PassedThrough{},
+              [](OBLoginData* self) { return self->GetServerUrl(); }, Session());
+}
+
+PyObject* OBLoginData_GetLoginTokenID(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_GetLoginTokenID", PassedThrough{},
+              [](OBLoginData* self) { return self->GetLoginTokenID(); }, Session());
+}
+
+PyObject* OBLoginData_GetCategoryCount(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_GetCategoryCount", ReturnsInt{},
+              [](OBLoginData* self) { return self->GetCategoryCount(); }, Session());
+}
+
+PyObject* OBLoginData_m_hInternet_set(PyObject*, PyObject* args) {
+  return SetHandle(args, "OBLoginData_m_hInternet_set", &OBLoginData::m_hInternet);
+}
+
+PyObject* OBLoginData_m_hInternet_get(PyObject*, PyObject* args) {
+  return GetHandle(args, "OBLoginData_m_hInternet_get", &OBLoginData::m_hInternet);
+}
+
+PyObject* OBLoginData_m_hConnect_set(PyObject*, PyObject* args) {
+  return SetHandle(args, "OBLoginData_m_hConnect_set", &OBLoginData::m_hConnect);
+}
+
+PyObject* OBLoginData_m_hConnect_get(PyObject*, PyObject* args) {
+  return GetHandle(args, "OBLoginData_m_hConnect_get", &OBLoginData::m_hConnect);
+}
+
+PyObject* OBLoginData_m_hRequest_set(PyObject*, PyObject* args) {
+  return SetHandle(args, "OBLoginData_m_hRequest_set", &OBLoginData::m_hRequest);
+}
+
+PyObject* OBLoginData_m_hRequest_get(PyObject*, PyObject* args) {
+  return GetHandle(args, "OBLoginData_m_hRequest_get", &OBLoginData::m_hRequest);
+}
+
+PyObject* OBLoginData_m_bServerReachable_set(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_m_bServerReachable_set", ReturnsNone{},
+              [](OBLoginData* self, int reachable) { self->m_bServerReachable = reachable; },
+              Session(OnNull::kSkipCall), Integer("BOOL"));
+}
+
+PyObject* OBLoginData_m_bServerReachable_get(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_m_bServerReachable_get", ReturnsInt{},
+              [](OBLoginData* self) { return self->m_bServerReachable; }, Session());
+}
+
+PyObject* OBLoginData_m_szChkServerUrl_set(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_m_szChkServerUrl_set", ReturnsNone{},
+              [](OBLoginData* self, const UrlBuffer& url) {
+                std::copy(url.begin(), url.end(), self->m_szChkServerUrl);
+              },
+              Session(), NarrowArray<kMaxPath>("char [_MAX_PATH]"));
+}
+
+// All kMaxPath bytes: the array need not hold a terminator.
+PyObject* OBLoginData_m_szChkServerUrl_get(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_m_szChkServerUrl_get", ReturnsStr{},
+              [](OBLoginData* self) { return std::string_view(self->m_szChkServerUrl, kMaxPath); },
+              Session());
+}
+
+PyObject* OBLoginData_swigregister(PyObject*, PyObject* args) {
+  return Register(args, Type(TypeId::OBLoginData));
+}
+
+}  // namespace module

@@ -1,0 +1,202 @@
+"""The OBLoginData session from Python: a new session, its accessors, its probe
+members and the arguments the module refuses."""
+import ctypes
+import unittest
+
+import _PyUploaderTestPeer as peer
+import _PyUploader as native
+from binding_support import address_of, run_python
+
+MAX_PATH = 260
+
+
+def handle_value(pointer_object):
+    """The HINTERNET held in the heap cell a getter returned."""
+    return ctypes.c_void_p.from_address(address_of(pointer_object)).value or 0
+
+
+def set_handle_value(pointer_object, value):
+    ctypes.c_void_p.from_address(address_of(pointer_object)).value = value
+
+
+class NewSession(unittest.TestCase):
+
+    def setUp(self):
+        self.session = native.new_OBLoginData(u'5.0', u'Retail', u'machine-1')
+
+    def tearDown(self):
+        native.delete_OBLoginData(self.session)
+
+    def test_is_a_bare_pointer_object(self):
+        self.assertIn("<Swig Object of type 'OBLoginData *' at 0x", repr(self.session))
+
+    def test_texts_are_empty_unicode_and_there_are_no_categories(self):
+        for getter in (native.OBLoginData_GetUserName, native.OBLoginData_GetServerUrl,
+                       native.OBLoginData_GetLoginTokenID):
+            value = getter(self.session)
+            self.assertIs(type(value), unicode, getter.__name__)
+            self.assertEqual(value, u'', getter.__name__)
+        self.assertEqual(native.OBLoginData_GetCategoryCount(self.session), 0)
+
+    def test_probe_members_start_cleared(self):
+        self.assertEqual(native.OBLoginData_m_bServerReachable_get(self.session), 0)
+        self.assertEqual(native.OBLoginData_m_szChkServerUrl_get(self.session), '')
+        for getter in (native.OBLoginData_m_hInternet_get, native.OBLoginData_m_hConnect_get,
+                       native.OBLoginData_m_hRequest_get):
+            handle = getter(self.session)
+            self.assertIn("'HINTERNET *'", repr(handle))
+            self.assertEqual(handle_value(handle), 0, getter.__name__)
+
+    def test_a_collected_handle_cell_is_reported_as_a_leak(self):
+        code, out, err = run_python("""
+            import _PyUploader as native
+            session = native.new_OBLoginData(u'5.0', u'', u'')
+            native.OBLoginData_m_hConnect_get(session)
+            native.delete_OBLoginData(session)
+            """)
+        self.assertEqual(code, 0, err)
+        self.assertEqual(out, "swig/python detected a memory leak of type 'HINTERNET *', "
+                              "no destructor found.\n")
+
+    def test_a_registered_class_instance_stands_for_its_session(self):
+        class Session(object):
+            __swig_destroy__ = native.delete_OBLoginData
+
+            def __init__(self):
+                self.this = native.new_OBLoginData(u'5.0', u'', u'')
+        native.OBLoginData_swigregister(Session)
+        session = Session()
+        self.assertEqual(native.OBLoginData_GetUserName(session), u'')
+        native.OBLoginData_m_bServerReachable_set(session, 1)
+        self.assertEqual(native.OBLoginData_m_bServerReachable_get(session), 1)
+
+
+class ProbeMembers(unittest.TestCase):
+
+    def setUp(self):
+        self.session = native.new_OBLoginData(u'5.0', u'Retail', u'machine-1')
+
+    def tearDown(self):
+        native.delete_OBLoginData(self.session)
+
+    def url(self):
+        return native.OBLoginData_m_szChkServerUrl_get(self.session)
+
+    def set_url(self, value):
+        native.OBLoginData_m_szChkServerUrl_set(self.session, value)
+
+    def test_a_short_url_clears_the_rest_of_the_array(self):
+        self.set_url('x' * MAX_PATH)
+        self.set_url('a' * 100)
+        self.assertEqual(self.url(), 'a' * 100)
+
+    def test_a_full_array_needs_no_terminator(self):
+        self.set_url('b' * MAX_PATH)
+        self.assertEqual(self.url(), 'b' * MAX_PATH)
+
+    def test_the_getter_keeps_zero_bytes_before_the_last_other_byte(self):
+        self.set_url('a\0\0b\0\0')
+        self.assertEqual(self.url(), 'a\0\0b')
+
+    def test_none_clears_the_array(self):
+        self.set_url('abc')
+        self.set_url(None)
+        self.assertEqual(self.url(), '')
+
+    def test_too_long_or_unicode_urls_are_refused_and_change_nothing(self):
+        self.set_url('keep')
+        for value in ('c' * (MAX_PATH + 1), u'unicode', 5):
+            with self.assertRaises(TypeError) as caught:
+                self.set_url(value)
+            self.assertEqual(str(caught.exception), "in method 'OBLoginData_m_szChkServerUrl_set', "
+                                                    "argument 2 of type 'char [_MAX_PATH]'")
+        self.assertEqual(self.url(), 'keep')
+
+    def test_reachable_flag_takes_32_bit_integers(self):
+        for value, stored in ((True, 1), (0, 0), (-5, -5), (2 ** 31 - 1, 2 ** 31 - 1), (7L, 7)):
+            native.OBLoginData_m_bServerReachable_set(self.session, value)
+            self.assertEqual(native.OBLoginData_m_bServerReachable_get(self.session), stored)
+        for value in (2 ** 31, -2 ** 31 - 1, 1.0, '1', None):
+            with self.assertRaises(TypeError) as caught:
+                native.OBLoginData_m_bServerReachable_set(self.session, value)
+            self.assertEqual(str(caught.exception), "in method 'OBLoginData_m_bServerReachable_set', "
+                                                    "argument 2 of type 'BOOL'")
+
+    def test_handles_are_copied_in_and_out_through_heap_cells(self):
+        members = ('m_hInternet', 'm_hConnect', 'm_hRequest')
+        for number, member in enumerate(members, 1):
+            cell = getattr(native, 'OBLoginData_%s_get' % member)(self.session)
+            set_handle_value(cell, 0x1000 * number)
+            getattr(native, 'OBLoginData_%s_set' % member)(self.session, cell)
+            set_handle_value(cell, 0)  # the member holds a copy
+        for number, member in enumerate(members, 1):
+            cell = getattr(native, 'OBLoginData_%s_get' % member)(self.session)
+            self.assertEqual(handle_value(cell), 0x1000 * number, member)
+
+
+class RefusedArguments(unittest.TestCase):
+
+    def setUp(self):
+        self.session = native.new_OBLoginData(u'5.0', u'Retail', u'machine-1')
+        self.text = peer.new_CString(u'text')
+        self.record = native.new_infoEffectURL(self.text, self.text, self.text)
+
+    def tearDown(self):
+        native.delete_infoEffectURL(self.record)
+        peer.delete_CString(self.text)
+        native.delete_OBLoginData(self.session)
+
+    def assertRaisesText(self, error, text, function, *args):
+        with self.assertRaises(error) as caught:
+            function(*args)
+        self.assertEqual(str(caught.exception), text)
+
+    def test_constructor_takes_only_unicode(self):
+        for args in (('5.0', u'R', u'id'), (u'5.0', 'R', u'id'), (u'5.0', u'R', None),
+                     (u'5.0', u'R', self.text)):
+            self.assertRaisesText(TypeError, 'Unicode string expected', native.new_OBLoginData, *args)
+
+    def test_constructor_accepts_unicode_subclasses(self):
+        class Text(unicode):
+            pass
+        session = native.new_OBLoginData(Text(u'5.0'), Text(u''), Text(u'id'))
+        native.delete_OBLoginData(session)
+
+    def test_objects_of_another_type(self):
+        for function in (native.OBLoginData_GetUserName, native.OBLoginData_GetServerUrl,
+                         native.OBLoginData_GetLoginTokenID, native.OBLoginData_GetCategoryCount,
+                         native.OBLoginData_m_hRequest_get, native.delete_OBLoginData):
+            self.assertRaisesText(TypeError, "in method '%s', argument 1 of type 'OBLoginData *'"
+                                  % function.__name__, function, self.record)
+
+    def test_handles_of_another_type_or_null(self):
+        self.assertRaisesText(TypeError, "in method 'OBLoginData_m_hConnect_set', argument 2 of type "
+                              "'HINTERNET'", native.OBLoginData_m_hConnect_set, self.session, self.text)
+        self.assertRaisesText(ValueError, "invalid null reference in method 'OBLoginData_m_hInternet_set', "
+                              "argument 2 of type 'HINTERNET'",
+                              native.OBLoginData_m_hInternet_set, self.session, None)
+
+    def test_null_objects(self):
+        cell = native.OBLoginData_m_hInternet_get(self.session)
+        for function, value in ((native.OBLoginData_m_hInternet_set, cell),
+                                (native.OBLoginData_m_hConnect_set, cell),
+                                (native.OBLoginData_m_hRequest_set, cell),
+                                (native.OBLoginData_m_bServerReachable_set, 1)):
+            self.assertIsNone(function(None, value), function.__name__)
+        self.assertIsNone(native.delete_OBLoginData(None))
+        for function, args in ((native.OBLoginData_GetUserName, ()),
+                               (native.OBLoginData_m_szChkServerUrl_set, ('x',))):
+            self.assertRaisesText(ValueError, "invalid null reference in method '%s', argument 1 of "
+                                  "type 'OBLoginData *'" % function.__name__, function, None, *args)
+
+    def test_wrong_argument_counts(self):
+        self.assertRaisesText(TypeError, 'OBLoginData_GetUserName expected 1 arguments, got 0',
+                              native.OBLoginData_GetUserName)
+        self.assertRaisesText(TypeError, 'new_OBLoginData expected 3 arguments, got 2',
+                              native.new_OBLoginData, u'5.0', u'R')
+        self.assertRaisesText(TypeError, 'swigregister expected 1 arguments, got 0',
+                              native.OBLoginData_swigregister)
+
+
+if __name__ == '__main__':
+    unittest.main()
