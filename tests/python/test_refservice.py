@@ -319,6 +319,8 @@ class RecordingTest(ServiceTestCase):
         self.assertEqual(stored.content, data[:64 * 1024])
         self.assertTrue(record.body_truncated)
         self.assertEqual(os.path.getsize(stored.path), len(data))
+        [brief] = self.svc.requests(path='/servlet/uploadTemplate', bodies=False)
+        self.assertEqual((brief.body, brief.upload.files[0].content), (None, None))
         self.svc.reset()
         self.assertFalse(os.path.exists(stored.path))
 

@@ -5,7 +5,9 @@
     POST /script {"host", "path", "replies": [...], "repeat": false}
     POST /host   {"host", "state": "up" | "down" | "hang"}
     POST /tls    {"cert": "good" | "expired" | "wrong-name"}
-    GET  /requests?host=&path=&since=     {"requests": [...]} in arrival order
+    GET  /requests?host=&path=&since=&bodies=0
+                                          {"requests": [...]} in arrival order;
+                                          bodies=0 leaves bodies and part contents out
     GET  /connections?host=               {"connections": [...]}
 
 Byte strings in replies are objects {"base64": "..."}.
@@ -99,8 +101,9 @@ class _ControlHandler(BaseHTTPRequestHandler):
 
     def _requests(self, query, body):
         since = int(query.get('since', 0))
+        bodies = query.get('bodies') != '0'
         return {'requests': self._service.recorder.requests(query.get('host'),
-                                                            query.get('path'), since)}
+                                                            query.get('path'), since, bodies)}
 
     def _connections(self, query, body):
         return {'connections': self._service.recorder.connections(query.get('host'))}

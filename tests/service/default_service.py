@@ -66,7 +66,7 @@ class DefaultService(object):
             '/servlet/GetEffectByGUIDForQZM': self._effect,
             '/servlet/uploadTemplate': self._upload,
         }.get(head.path, self._not_found)
-        query = parse_qs(head.query, keep_blank_values=True, encoding='latin-1')
+        query = parse_qs(head.query, keep_blank_values=True, errors='replace')
         return handler(dict((k, v[0]) for k, v in query.items()), record)
 
     def _home(self, query, record):

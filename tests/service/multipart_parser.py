@@ -43,8 +43,8 @@ class MultipartParser(object):
             self.error = 'body ended before the closing delimiter'
         self._state = None
 
-    def to_json(self):
-        return {'boundary': self._boundary, 'parts': [p.to_json() for p in self.parts],
+    def to_json(self, contents=True):
+        return {'boundary': self._boundary, 'parts': [p.to_json(contents) for p in self.parts],
                 'complete': self.complete, 'error': self.error}
 
     # Each state consumes what it can and says whether it made progress.
@@ -186,9 +186,9 @@ class Part(object):
             self._file.close()
             self._file = None
 
-    def to_json(self):
+    def to_json(self, contents=True):
         return {'kind': 'field' if self.filename is None else 'file',
                 'head': self.head, 'name': self.name, 'filename': self.filename,
                 'content_type': self.content_type, 'size': self.size,
-                'sha256': self._sha256.hexdigest(), 'content': self.content,
+                'sha256': self._sha256.hexdigest(), 'content': self.content if contents else None,
                 'inline': self.size <= INLINE_LIMIT, 'path': self.path}

@@ -36,7 +36,9 @@ class Record(object):
             if room > 0:
                 self.body += data[:room]
 
-    def to_json(self):
+    def to_json(self, bodies=True):
+        """The record for the control interface; without bodies, the body and
+        the parts' contents are left out (for cheap polling)."""
         head = self.head
         info = self.connection.info
         return {
@@ -46,11 +48,11 @@ class Record(object):
             'method': head.method, 'target': head.target, 'path': head.path,
             'query': head.query, 'version': head.version,
             'headers': [[k, v] for k, v in head.headers], 'head': head.raw,
-            'chunked': head.is_chunked(), 'body': bytes(self.body),
+            'chunked': head.is_chunked(), 'body': bytes(self.body) if bodies else None,
             'body_size': self.body_size, 'body_sha256': self._sha256.hexdigest(),
             'body_truncated': self.body_size > len(self.body), 'wire_size': self.wire_size,
             'complete': self.complete, 'error': self.error,
-            'upload': self.upload.to_json() if self.upload else None,
+            'upload': self.upload.to_json(bodies) if self.upload else None,
             'reply_status': self.reply_status,
         }
 
@@ -81,10 +83,10 @@ class Recorder(object):
             connection.info['requests'] += 1
             return record
 
-    def requests(self, host=None, path=None, since=0):
+    def requests(self, host=None, path=None, since=0, bodies=True):
         with self._lock:
             records = list(self._requests)
-        return [r.to_json() for r in records
+        return [r.to_json(bodies) for r in records
                 if r.seq > since and host in (None, r.connection.info['host'])
                 and path in (None, r.head.path)]
 
