@@ -19,13 +19,16 @@ def set_handle_value(pointer_object, value):
     ctypes.c_void_p.from_address(address_of(pointer_object)).value = value
 
 
-class NewSession(unittest.TestCase):
+class SessionTest(unittest.TestCase):
 
     def setUp(self):
         self.session = native.new_OBLoginData(u'5.0', u'Retail', u'machine-1')
 
     def tearDown(self):
         native.delete_OBLoginData(self.session)
+
+
+class NewSession(SessionTest):
 
     def test_is_a_bare_pointer_object(self):
         self.assertIn("<Swig Object of type 'OBLoginData *' at 0x", repr(self.session))
@@ -71,13 +74,7 @@ class NewSession(unittest.TestCase):
         self.assertEqual(native.OBLoginData_m_bServerReachable_get(session), 1)
 
 
-class ProbeMembers(unittest.TestCase):
-
-    def setUp(self):
-        self.session = native.new_OBLoginData(u'5.0', u'Retail', u'machine-1')
-
-    def tearDown(self):
-        native.delete_OBLoginData(self.session)
+class ProbeMembers(SessionTest):
 
     def url(self):
         return native.OBLoginData_m_szChkServerUrl_get(self.session)
@@ -134,17 +131,17 @@ class ProbeMembers(unittest.TestCase):
             self.assertEqual(handle_value(cell), 0x1000 * number, member)
 
 
-class RefusedArguments(unittest.TestCase):
+class RefusedArguments(SessionTest):
 
     def setUp(self):
-        self.session = native.new_OBLoginData(u'5.0', u'Retail', u'machine-1')
+        SessionTest.setUp(self)
         self.text = peer.new_CString(u'text')
         self.record = native.new_infoEffectURL(self.text, self.text, self.text)
 
     def tearDown(self):
         native.delete_infoEffectURL(self.record)
         peer.delete_CString(self.text)
-        native.delete_OBLoginData(self.session)
+        SessionTest.tearDown(self)
 
     def assertRaisesText(self, error, text, function, *args):
         with self.assertRaises(error) as caught:

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <optional>
 #include <string>
 
@@ -10,6 +11,27 @@
 namespace {
 
 using test_support::TraceCapture;
+
+// Runs `lines` in a fresh process (the switch and prefix start as at load) with the
+// switch on, and tells whether the trace output is then `expected`.
+#define EXPECT_FRESH_PROCESS_WRITES(lines, expected)                        \
+  EXPECT_EXIT(                                                             \
+      {                                                                    \
+        bool asExpected;                                                   \
+        {                                                                  \
+          TraceCapture capture(1);                                         \
+          lines;                                                           \
+          asExpected = capture.Bytes() == (expected);                      \
+        }                                                                  \
+        std::exit(asExpected ? 0 : 1);                                     \
+      },                                                                   \
+      ::testing::ExitedWithCode(0), "")
+
+TEST(TraceAtLoad, IsOffUntilAComponentReadsTheSwitch) {
+  GTEST_FLAG_SET(death_test_style, "threadsafe");  // a new process, not a copy of this one
+  EXPECT_FRESH_PROCESS_WRITES(TraceMessage(L"early"), "");
+  EXPECT_FRESH_PROCESS_WRITES((TraceSetPrefix("Unit"), TraceMessage(L"late")), "[Unit]late\n");
+}
 
 struct SwitchCase {
   std::optional<std::uint32_t> dumpMsg;  // empty: the value is missing

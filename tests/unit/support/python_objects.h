@@ -22,13 +22,6 @@ class PyRef {
   PyObject* object_;
 };
 
-// A global of __main__, as a new reference.
-inline PyObject* MainGlobal(const char* name) {
-  PyObject* value = PyObject_GetAttrString(PyImport_AddModule("__main__"), name);
-  EXPECT_NE(value, nullptr) << name;
-  return value;
-}
-
 // The value of a Python expression evaluated in __main__, as its repr.
 inline std::string EvalRepr(const char* expression) {
   PyObject* globals = PyModule_GetDict(PyImport_AddModule("__main__"));

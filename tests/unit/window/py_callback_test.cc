@@ -11,8 +11,6 @@
 namespace {
 
 using test_support::EvalRepr;
-using test_support::MainGlobal;
-using test_support::PyRef;
 using test_support::RunPython;
 
 class PyCallbackTest : public ::testing::Test {
@@ -26,72 +24,69 @@ class PyCallbackTest : public ::testing::Test {
         "    calls.append(args)\n"
         "    raise ValueError('reported and cleared')\n");
   }
+
+  // Borrowed: __main__ keeps its globals alive.
+  static PyObject* Global(const char* name) {
+    return PyDict_GetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), name);
+  }
+
+  PyCallback callback_;
 };
 
 TEST_F(PyCallbackTest, FormatsBuildTheArgumentTuple) {
-  PyRef record(MainGlobal("record"));
-  PyCallback callback;
-  callback.SetCallback(record.get());
-  callback.Call("i", 5);
-  callback.Call("");
-  callback.Call(nullptr);
-  callback.Call("uuii", L"PROGRESS", L"ProgressChanged", 33, 7);
-  callback.Call("uuiiuu", L"PROGRESS", L"UploadComplete", 100, 1, L"http://x/\u00E4", L"");
+  callback_.SetCallback(Global("record"));
+  callback_.Call("i", 5);
+  callback_.Call("");
+  callback_.Call(nullptr);
+  callback_.Call("uuii", L"PROGRESS", L"ProgressChanged", 33, 7);
+  callback_.Call("uuiiuu", L"PROGRESS", L"UploadComplete", 100, 1, L"http://x/\u00E4", L"");
   EXPECT_EQ(EvalRepr("calls"),
             "[(5,), (), (), (u'PROGRESS', u'ProgressChanged', 33, 7), "
             "(u'PROGRESS', u'UploadComplete', 100, 1, u'http://x/\\xe4', u'')]");
 }
 
 TEST_F(PyCallbackTest, NoneOrNullUnregisters) {
-  PyRef record(MainGlobal("record"));
-  PyCallback callback;
-  callback.SetCallback(record.get());
-  callback.SetCallback(Py_None);
-  callback.Call("i", 1);
-  callback.SetCallback(record.get());
-  callback.SetCallback(nullptr);
-  callback.Call("i", 2);
+  callback_.SetCallback(Global("record"));
+  callback_.SetCallback(Py_None);
+  callback_.Call("i", 1);
+  callback_.SetCallback(Global("record"));
+  callback_.SetCallback(nullptr);
+  callback_.Call("i", 2);
   EXPECT_EQ(EvalRepr("calls"), "[]");
 }
 
 TEST_F(PyCallbackTest, HoldsOneReferenceHoweverOftenTheSameCallableIsRegistered) {
-  PyRef record(MainGlobal("record"));
-  const Py_ssize_t unregistered = Py_REFCNT(record.get());
+  PyObject* record = Global("record");
+  const Py_ssize_t unregistered = Py_REFCNT(record);
   {
     PyCallback callback;
-    callback.SetCallback(record.get());
-    callback.SetCallback(record.get());
-    EXPECT_EQ(Py_REFCNT(record.get()), unregistered + 1);
+    callback.SetCallback(record);
+    callback.SetCallback(record);
+    EXPECT_EQ(Py_REFCNT(record), unregistered + 1);
   }
-  EXPECT_EQ(Py_REFCNT(record.get()), unregistered);
+  EXPECT_EQ(Py_REFCNT(record), unregistered);
 }
 
 TEST_F(PyCallbackTest, ARaisingCallableDoesNotStopLaterCalls) {
-  PyRef flaky(MainGlobal("flaky"));
-  PyCallback callback;
-  callback.SetCallback(flaky.get());
-  callback.Call("i", 1);
+  callback_.SetCallback(Global("flaky"));
+  callback_.Call("i", 1);
   EXPECT_EQ(PyErr_Occurred(), nullptr);
-  callback.Call("i", 2);
+  callback_.Call("i", 2);
   EXPECT_EQ(EvalRepr("calls"), "[(1,), (2,)]");
 }
 
 TEST_F(PyCallbackTest, ArgumentsThatCannotBeBuiltSkipTheCall) {
-  PyRef record(MainGlobal("record"));
-  PyCallback callback;
-  callback.SetCallback(record.get());
-  callback.Call("q", 1);  // not a format unit
+  callback_.SetCallback(Global("record"));
+  callback_.Call("q", 1);  // not a format unit
   EXPECT_EQ(PyErr_Occurred(), nullptr);
   EXPECT_EQ(EvalRepr("calls"), "[]");
 }
 
 TEST_F(PyCallbackTest, ACallFromAThreadWithoutTheLockTakesIt) {
-  PyRef record(MainGlobal("record"));
-  PyCallback callback;
-  callback.SetCallback(record.get());
+  callback_.SetCallback(Global("record"));
   {
     AllowThreadsGuard letOthersRun;
-    std::thread([&] { callback.Call("i", 42); }).join();
+    std::thread([&] { callback_.Call("i", 42); }).join();
   }
   EXPECT_EQ(EvalRepr("calls"), "[(42,)]");
 }
