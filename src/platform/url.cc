@@ -31,9 +31,12 @@ bool AllFit(const Components& c) {
 
 bool Split(std::string_view text, Components* components) {
   if (text.find('\0') != std::string_view::npos) return false;
-  // Only absolute URLs with an authority: "scheme://host...".
+  // Only absolute URLs with an authority: "scheme://host...". libcurl would
+  // read "http:///p" as the host "p"; the system's parser finds no host there.
   const std::size_t colon = text.find(':');
   if (colon == std::string_view::npos || text.substr(colon + 1, 2) != "//") return false;
+  const std::size_t authority = colon + 3;
+  if (authority >= text.size() || text[authority] == '/') return false;
   const curl::Url handle(curl_url());
   if (!handle) return false;
   const std::string whole(text);

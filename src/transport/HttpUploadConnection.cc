@@ -1,0 +1,69 @@
+#include "transport/HttpUploadConnection.h"
+
+#include "platform/text.h"
+#include "transport/UploadProgress.h"
+#include "transport/UploadRequest.h"
+
+UploadConnectionOpener HttpUploadConnection::Opener(std::uint16_t port) {
+  return [port](const UploadRequest& request, UploadProgress* listener,
+                std::unique_ptr<UploadConnection>* out) {
+    *out = std::make_unique<HttpUploadConnection>(request.host, port, request.path, listener);
+    return win::kOk;
+  };
+}
+
+HttpUploadConnection::HttpUploadConnection(const std::string& host, std::uint16_t port,
+                                           const std::string& path, UploadProgress* listener)
+    : listener_(listener),
+      session_(kAgent, this),
+      connection_(session_, host, port, http::Scheme::kHttp),
+      request_(connection_, "POST", path) {}
+
+win::Status HttpUploadConnection::AddHeader(const std::string& line) {
+  return request_.AddHeaders(line);
+}
+
+win::Status HttpUploadConnection::Start(std::uint32_t contentLength) {
+  return request_.Start(contentLength);
+}
+
+win::Status HttpUploadConnection::Write(std::string_view piece) { return request_.Write(piece); }
+
+// A reply whose head arrived has ended the request, even when its body could
+// not be read whole.
+win::Status HttpUploadConnection::End() {
+  const win::Status ended = request_.End();
+  return request_.status_code() != 0 ? win::kOk : ended;
+}
+
+bool HttpUploadConnection::QueryStatusCode(std::uint32_t* code) {
+  *code = request_.status_code();
+  return *code != 0;
+}
+
+std::string HttpUploadConnection::ReadReply() { return request_.body(); }
+
+void HttpUploadConnection::OnResolvingName(const std::string& host) {
+  listener_->OnResolvingName(text::Utf8ToWide(host).c_str());
+}
+
+void HttpUploadConnection::OnNameResolved(const std::string& address) {
+  listener_->OnNameResolved(text::Utf8ToWide(address).c_str());
+}
+
+void HttpUploadConnection::OnConnectingToServer(const std::string& address) {
+  listener_->OnConnectingToServer(text::Utf8ToWide(address).c_str());
+}
+
+void HttpUploadConnection::OnConnectedToServer(const std::string& address) {
+  listener_->OnConnectedToServer(text::Utf8ToWide(address).c_str());
+}
+
+void HttpUploadConnection::OnSendingRequest() { listener_->OnSendingRequest(); }
+void HttpUploadConnection::OnRequestSent(std::uint32_t bytes) { listener_->OnRequestSent(bytes); }
+void HttpUploadConnection::OnReceivingResponse() { listener_->OnReceivingResponse(); }
+void HttpUploadConnection::OnResponseReceived(std::uint32_t bytes) {
+  listener_->OnResponseReceived(bytes);
+}
+void HttpUploadConnection::OnClosingConnection() { listener_->OnClosingConnection(); }
+void HttpUploadConnection::OnConnectionClosed() { listener_->OnConnectionClosed(); }

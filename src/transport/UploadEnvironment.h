@@ -1,0 +1,27 @@
+// What the upload engine takes from its surroundings: the clock, the pause and
+// the connection. Production uses the platform's; tests inject their own.
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <memory>
+
+#include "platform/win_error.h"
+#include "transport/UploadConnection.h"
+
+class UploadProgress;
+class UploadRequest;
+
+// Opens the POST for the request's path on its host; connection notifications
+// go to the listener.
+using UploadConnectionOpener = std::function<win::Status(
+    const UploadRequest& request, UploadProgress* listener, std::unique_ptr<UploadConnection>* out)>;
+
+struct UploadEnvironment {
+  std::function<std::uint32_t()> tickCount;  // milliseconds, wrapping at 2^32
+  std::function<void(std::uint32_t)> sleep;  // milliseconds
+  UploadConnectionOpener openConnection;
+
+  // The steady clock, a real sleep and HTTP on port 80.
+  static UploadEnvironment Platform();
+};

@@ -1,0 +1,10 @@
+// One file field of an upload form.
+#pragma once
+
+#include <string>
+
+struct UploadFile {
+  std::wstring name;         // form field name of the part
+  std::wstring path;         // local path; also sent as the part's file name
+  std::wstring contentType;  // media type of the part
+};

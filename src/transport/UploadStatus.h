@@ -1,0 +1,7 @@
+// Status codes of the upload transport's own.
+#pragma once
+
+#include "platform/win_error.h"
+
+// The listener's IsCancelled answered true while a file was streaming.
+constexpr win::Status UPLOAD_E_CANCELLED = static_cast<win::Status>(0x80040301u);
