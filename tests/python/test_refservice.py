@@ -315,7 +315,8 @@ class RecordingTest(ServiceTestCase):
         self.assertEqual(status, 200)
         [record] = self.svc.requests(path='/servlet/uploadTemplate')
         [stored] = record.upload.files
-        self.assertEqual((stored.size, stored.sha256), (len(data), hashlib.sha256(data).hexdigest()))
+        self.assertEqual((stored.size, stored.sha256),
+                         (len(data), hashlib.sha256(data).hexdigest()))
         self.assertEqual(stored.content, data[:64 * 1024])
         self.assertTrue(record.body_truncated)
         self.assertEqual(os.path.getsize(stored.path), len(data))

@@ -33,9 +33,10 @@ class Connection(object):
             self._sock.settimeout(IDLE_TIMEOUT)
             if self.info['tls'] and not self._handshake():
                 return
-            reader = RequestReader(self._sock.makefile('rb'))
-            while self._serve_one(reader):
-                pass
+            with self._sock.makefile('rb') as stream:
+                reader = RequestReader(stream)
+                while self._serve_one(reader):
+                    pass
             self._say_goodbye()
         except (OSError, ssl.SSLError) as error:
             log.info('connection %s to %s ended: %s', self.info['id'], self.host, error)

@@ -131,4 +131,5 @@ class DefaultService(object):
 
     @staticmethod
     def _upload_reply(status, url, error):
-        return xml_reply('uploadTemplate', elements([('templateUrl', url), ('errMsg', error)]), status)
+        fields = [('templateUrl', url), ('errMsg', error)]
+        return xml_reply('uploadTemplate', elements(fields), status)
