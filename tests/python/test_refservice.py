@@ -5,6 +5,7 @@ import errno
 import hashlib
 import os
 import socket
+import threading
 import time
 import unittest
 import urllib
@@ -238,9 +239,12 @@ class ScriptedRepliesTest(ServiceTestCase):
         size, rate = 300000, 100000
         self.svc.script(SERVER_HOST, self.path, [reply('ok', read_rate=rate)])
         sock = self.connect()
-        sock.sendall(request('POST', self.path, body='s' * size))
-        [reading] = self.svc.wait_for_requests(path=self.path)
+        sender = threading.Thread(target=sock.sendall,
+                                  args=(request('POST', self.path, body='s' * size),))
+        sender.start()
+        [reading] = self.svc.wait_for_requests(path=self.path, ready=lambda r: r.body_size)
         self.assertLess(reading.body_size, size)  # the pace leaves most of it unread
+        sender.join()
         sock.settimeout(30)
         self.assertTrue(sock.recv(65536).startswith('HTTP/1.1 200'))
         self.assertEqual(self.svc.requests(path=self.path)[0].body_size, size)
