@@ -9,6 +9,7 @@ import os
 import subprocess
 import sys
 import textwrap
+import unittest
 
 # Offsets in a pointer object after the object header (reference count, type).
 _HEADER = 2 * ctypes.sizeof(ctypes.c_void_p)
@@ -88,3 +89,31 @@ class Relocated(object):
         set_type(self.pointer_object, type_info)
         self.pointer_object.own(owned)
         return False
+
+
+class Scenarios(unittest.TestCase):
+    """Runs scenarios in fresh interpreters: `PRELUDE`, then the scenario's body."""
+
+    PRELUDE = ''
+
+    def run_scenario(self, body):
+        code, out, err = run_python(textwrap.dedent(self.PRELUDE) + textwrap.dedent(body))
+        self.assertEqual(code, 0, err)
+        return out
+
+
+class WithRecord(unittest.TestCase):
+    """Each test has `self.text`, a "CString *" made by the peer module, and
+    `self.record`, an infoEffectURL made from it; both are deleted afterwards."""
+
+    def setUp(self):
+        import _PyUploaderTestPeer as peer
+        import _PyUploader as native
+        self.text = peer.new_CString(u'text')
+        self.record = native.new_infoEffectURL(self.text, self.text, self.text)
+
+    def tearDown(self):
+        import _PyUploaderTestPeer as peer
+        import _PyUploader as native
+        native.delete_infoEffectURL(self.record)
+        peer.delete_CString(self.text)

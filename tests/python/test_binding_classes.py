@@ -4,7 +4,7 @@ import weakref
 
 import _PyUploaderTestPeer as peer
 import _PyUploader as native
-from binding_support import run_python
+from binding_support import Scenarios
 
 LEAK = "swig/python detected a memory leak of type '%s', no destructor found.\n"
 
@@ -79,7 +79,7 @@ class AcceptedObjects(unittest.TestCase):
         native.delete_infoEffectURL(made)
 
 
-class Collection(unittest.TestCase):
+class Collection(Scenarios):
     """Each scenario runs in a fresh interpreter, whose output is the evidence."""
 
     PRELUDE = '''
@@ -92,11 +92,6 @@ class Collection(unittest.TestCase):
             record.this = native.new_infoEffectURL(text, text, text)
             return record
     '''
-
-    def run_scenario(self, body):
-        code, out, err = run_python(self.PRELUDE + body)
-        self.assertEqual(code, 0, err)
-        return out
 
     def test_destroy_is_called_with_a_non_owning_stand_in(self):
         out = self.run_scenario('''
@@ -157,19 +152,16 @@ class Collection(unittest.TestCase):
         self.assertEqual(out, 'KeyError\n')
 
 
-class ShadowInstances(unittest.TestCase):
+class ShadowInstances(Scenarios):
     """Getters return an instance once a class is registered for their pointer type."""
 
-    def run_scenario(self, body):
-        code, out, err = run_python('''
+    PRELUDE = '''
         import _PyUploader as native, _PyUploaderTestPeer as peer
         text = peer.new_CString(u'text')
         text.disown()
         record = native.new_infoEffectURL(text, text, text)
         record.disown()
-        ''' + body)
-        self.assertEqual(code, 0, err)
-        return out
+    '''
 
     def test_new_style_classic_and_unusual_classes(self):
         out = self.run_scenario('''

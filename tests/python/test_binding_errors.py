@@ -3,17 +3,10 @@ import unittest
 
 import _PyUploaderTestPeer as peer
 import _PyUploader as native
+from binding_support import WithRecord
 
 
-class RefusedArguments(unittest.TestCase):
-
-    def setUp(self):
-        self.text = peer.new_CString(u'text')
-        self.record = native.new_infoEffectURL(self.text, self.text, self.text)
-
-    def tearDown(self):
-        native.delete_infoEffectURL(self.record)
-        peer.delete_CString(self.text)
+class RefusedArguments(WithRecord):
 
     def assertRaisesText(self, error, text, function, *args):
         with self.assertRaises(error) as caught:

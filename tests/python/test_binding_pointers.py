@@ -5,18 +5,10 @@ import unittest
 
 import _PyUploaderTestPeer as peer
 import _PyUploader as native
-from binding_support import Relocated, address_of, own_field, run_python
+from binding_support import Relocated, Scenarios, WithRecord, address_of, own_field
 
 
-class PointerObjects(unittest.TestCase):
-
-    def setUp(self):
-        self.text = peer.new_CString(u'text')
-        self.record = native.new_infoEffectURL(self.text, self.text, self.text)
-
-    def tearDown(self):
-        native.delete_infoEffectURL(self.record)
-        peer.delete_CString(self.text)
+class PointerObjects(WithRecord):
 
     def test_text_forms_and_numbers_at_a_known_address(self):
         with Relocated(self.record, 0x1234) as moved:
@@ -110,7 +102,7 @@ class PointerObjects(unittest.TestCase):
         peer.delete_CString(value)
 
 
-class DestroyingOwners(unittest.TestCase):
+class DestroyingOwners(Scenarios):
     """Collection of owning pointer objects, watched from a fresh interpreter."""
 
     PRELUDE = '''
@@ -119,13 +111,8 @@ class DestroyingOwners(unittest.TestCase):
         text.disown()
     '''
 
-    def run_collecting(self, body):
-        code, out, err = run_python(self.PRELUDE + body)
-        self.assertEqual(code, 0, err)
-        return out
-
     def test_leak_line_once_per_collected_owner_without_a_class(self):
-        out = self.run_collecting('''
+        out = self.run_scenario('''
         record = native.new_infoEffectURL(text, text, text)
         values = [native.infoEffectURL_strTag_get(record) for _ in range(3)]
         native.delete_infoEffectURL(record)
@@ -136,7 +123,7 @@ class DestroyingOwners(unittest.TestCase):
         self.assertEqual(out, leak * 3 + 'collected\n')
 
     def test_leak_line_names_the_display_name(self):
-        out = self.run_collecting('''
+        out = self.run_scenario('''
         from binding_support import ring_type, set_type
         handle = peer.new_CString(u'h')
         set_type(handle, ring_type('_p_HINTERNET'))
@@ -147,7 +134,7 @@ class DestroyingOwners(unittest.TestCase):
                               "no destructor found.\nend\n")
 
     def test_delete_leaves_nothing_for_collection(self):
-        out = self.run_collecting('''
+        out = self.run_scenario('''
         record = native.new_infoEffectURL(text, text, text)
         native.delete_infoEffectURL(record)
         print record.own()
@@ -161,7 +148,7 @@ class DestroyingOwners(unittest.TestCase):
         self.assertEqual(out, 'False\nend\n')
 
     def test_disowned_objects_destroy_nothing(self):
-        out = self.run_collecting('''
+        out = self.run_scenario('''
         record = native.new_infoEffectURL(text, text, text)
         value = native.infoEffectURL_strTag_get(record)
         native.delete_infoEffectURL(record)

@@ -1,7 +1,7 @@
 """Two modules of one type ring, imported in either order, each in a fresh interpreter."""
 import unittest
 
-from binding_support import run_python
+from binding_support import Scenarios
 
 SCENARIO = '''
 import sys
@@ -35,12 +35,10 @@ EXPECTED = ("['type_pointer']\n"
             "end\n")
 
 
-class SharedRing(unittest.TestCase):
+class SharedRing(Scenarios):
 
     def run_with(self, imports):
-        code, out, err = run_python(SCENARIO % {'imports': imports})
-        self.assertEqual(code, 0, err)
-        return out
+        return self.run_scenario(SCENARIO % {'imports': imports})
 
     def test_peer_imported_first(self):
         out = self.run_with('import _PyUploaderTestPeer as peer\nimport _PyUploader as native')

@@ -7,7 +7,7 @@
 
 #include "module/runtime/ClassData.h"
 #include "module/runtime/PyRef.h"
-#include "module/runtime/compatible_type.h"
+#include "module/runtime/StaticType.h"
 #include "module/runtime/text_form.h"
 
 namespace binding {
@@ -15,7 +15,6 @@ namespace binding {
 namespace {
 
 constexpr char kTypeName[] = "PySwigObject";
-constexpr char kDoc[] = "Swig object carries a C/C++ instance pointer";
 constexpr char kLeakLine[] = "swig/python detected a memory leak of type '%s', no destructor found.\n";
 
 PySwigObject* AsObject(PyObject* object) { return reinterpret_cast<PySwigObject*>(object); }
@@ -177,20 +176,13 @@ PyNumberMethods MakeNumberMethods() {
 
 PyTypeObject MakeType() {
   static PyNumberMethods number = MakeNumberMethods();
-  PyTypeObject type{};
-  Py_REFCNT(&type) = 1;
-  Py_TYPE(&type) = &PyType_Type;
-  type.tp_name = kTypeName;
-  type.tp_basicsize = sizeof(PySwigObject);
+  PyTypeObject type = StaticType::Template(kTypeName, sizeof(PySwigObject));
   type.tp_dealloc = Dealloc;
   type.tp_print = PrintSlot;
   type.tp_compare = CompareSlot;
   type.tp_repr = ReprSlot;
   type.tp_as_number = &number;
   type.tp_str = StrSlot;
-  type.tp_getattro = PyObject_GenericGetAttr;
-  type.tp_flags = Py_TPFLAGS_DEFAULT;
-  type.tp_doc = kDoc;
   type.tp_methods = kMethods;
   return type;
 }
@@ -198,9 +190,8 @@ PyTypeObject MakeType() {
 }  // namespace
 
 PyTypeObject* PySwigObjectType() {
-  static PyTypeObject type = MakeType();
-  static bool ready = PyType_Ready(&type) == 0;
-  return ready ? &type : nullptr;
+  static StaticType type(MakeType());
+  return type.get();
 }
 
 bool IsPySwigObject(PyObject* object) {

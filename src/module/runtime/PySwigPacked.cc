@@ -6,7 +6,7 @@
 #include <optional>
 #include <string>
 
-#include "module/runtime/compatible_type.h"
+#include "module/runtime/StaticType.h"
 #include "module/runtime/text_form.h"
 
 namespace binding {
@@ -14,7 +14,6 @@ namespace binding {
 namespace {
 
 constexpr char kTypeName[] = "PySwigPacked";
-constexpr char kDoc[] = "Swig object carries a C/C++ instance pointer";
 // The packed form is shown only while it fits this many characters with its terminator.
 constexpr size_t kPackedTextLimit = 1024;
 
@@ -62,28 +61,20 @@ void Dealloc(PyObject* self) {
 }
 
 PyTypeObject MakeType() {
-  PyTypeObject type{};
-  Py_REFCNT(&type) = 1;
-  Py_TYPE(&type) = &PyType_Type;
-  type.tp_name = kTypeName;
-  type.tp_basicsize = sizeof(PySwigPacked);
+  PyTypeObject type = StaticType::Template(kTypeName, sizeof(PySwigPacked));
   type.tp_dealloc = Dealloc;
   type.tp_print = PrintSlot;
   type.tp_compare = CompareSlot;
   type.tp_repr = ReprSlot;
   type.tp_str = StrSlot;
-  type.tp_getattro = PyObject_GenericGetAttr;
-  type.tp_flags = Py_TPFLAGS_DEFAULT;
-  type.tp_doc = kDoc;
   return type;
 }
 
 }  // namespace
 
 PyTypeObject* PySwigPackedType() {
-  static PyTypeObject type = MakeType();
-  static bool ready = PyType_Ready(&type) == 0;
-  return ready ? &type : nullptr;
+  static StaticType type(MakeType());
+  return type.get();
 }
 
 bool IsPySwigPacked(PyObject* object) {

@@ -6,6 +6,7 @@
 
 #include "module/runtime/PyRef.h"
 #include "module/runtime/TypeInfo.h"
+#include "module/runtime/status.h"
 
 namespace binding {
 

@@ -1,0 +1,216 @@
+// Argument and result conversions at their edges.
+#include <Python.h>
+
+#include <gtest/gtest.h>
+
+#include <array>
+#include <cstring>
+#include <memory>
+#include <string>
+
+#include "module/runtime/PyRef.h"
+#include "module/runtime/conversions.h"
+#include "module/runtime/status.h"
+#include "test_module.h"
+
+namespace {
+
+using binding::PyRef;
+using namespace binding_test;
+
+constexpr size_t kMaxPath = 260;
+
+PyRef Eval(const char* expression) {
+  PyRef globals(PyDict_New());
+  PyDict_SetItemString(globals.get(), "__builtins__", PyEval_GetBuiltins());
+  return PyRef(PyRun_String(expression, Py_eval_input, globals.get(), globals.get()));
+}
+
+struct IntCase {
+  const char* expression;
+  int status;
+  int value;
+};
+
+class AsIntCases : public ::testing::TestWithParam<IntCase> {};
+
+TEST_P(AsIntCases, AcceptsSigned32BitIntegersOnly) {
+  PyRef object = Eval(GetParam().expression);
+  ASSERT_TRUE(object) << TakeError();
+  int value = 12345;
+  EXPECT_EQ(binding::AsInt(object.get(), &value), GetParam().status);
+  EXPECT_EQ(value, GetParam().value);
+  EXPECT_EQ(TakeError(), "");
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Values, AsIntCases,
+    ::testing::Values(IntCase{"True", binding::STATUS_OK, 1}, IntCase{"False", binding::STATUS_OK, 0},
+                      IntCase{"-2**31", binding::STATUS_OK, -2147483647 - 1},
+                      IntCase{"2**31 - 1", binding::STATUS_OK, 2147483647},
+                      IntCase{"7L", binding::STATUS_OK, 7},
+                      IntCase{"2**31", binding::STATUS_TYPE_ERROR, 12345},
+                      IntCase{"-2**31 - 1", binding::STATUS_TYPE_ERROR, 12345},
+                      IntCase{"2L**31", binding::STATUS_TYPE_ERROR, 12345},
+                      IntCase{"2L**80", binding::STATUS_TYPE_ERROR, 12345},
+                      IntCase{"1.5", binding::STATUS_TYPE_ERROR, 12345},
+                      IntCase{"'1'", binding::STATUS_TYPE_ERROR, 12345},
+                      IntCase{"None", binding::STATUS_TYPE_ERROR, 12345}));
+
+struct ArrayCase {
+  const char* expression;
+  int status;
+  size_t copied;  // bytes of the str expected at the start of the buffer
+};
+
+class AsNarrowArrayCases : public ::testing::TestWithParam<ArrayCase> {};
+
+TEST_P(AsNarrowArrayCases, CopiesAtMostTheArrayAndZeroFillsTheRest) {
+  PyRef object = Eval(GetParam().expression);
+  ASSERT_TRUE(object) << TakeError();
+  std::array<char, kMaxPath + 8> buffer;
+  buffer.fill('#');
+  ASSERT_EQ(binding::AsNarrowArray(object.get(), buffer.data(), kMaxPath), GetParam().status);
+  EXPECT_EQ(TakeError(), "");
+  if (GetParam().status != binding::STATUS_OK) return;
+  for (size_t i = 0; i < GetParam().copied; ++i) ASSERT_EQ(buffer[i], 'a') << i;
+  for (size_t i = GetParam().copied; i < kMaxPath; ++i) ASSERT_EQ(buffer[i], '\0') << i;
+  for (size_t i = kMaxPath; i < buffer.size(); ++i) ASSERT_EQ(buffer[i], '#') << "overrun at " << i;
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Lengths, AsNarrowArrayCases,
+    ::testing::Values(ArrayCase{"'a' * 100", binding::STATUS_OK, 100},
+                      ArrayCase{"'a' * 259", binding::STATUS_OK, 259},
+                      ArrayCase{"'a' * 260", binding::STATUS_OK, 260},
+                      ArrayCase{"''", binding::STATUS_OK, 0},
+                      ArrayCase{"None", binding::STATUS_OK, 0},
+                      ArrayCase{"'a' * 261", binding::STATUS_TYPE_ERROR, 0},
+                      ArrayCase{"u'a'", binding::STATUS_TYPE_ERROR, 0},
+                      ArrayCase{"5", binding::STATUS_TYPE_ERROR, 0}));
+
+TEST(AsNarrowArray, TakesTheStringBehindACharPointer) {
+  char text[] = "pointed";
+  PyRef pointer(PointerTo(text, TestType::Char));
+  std::array<char, kMaxPath> buffer;
+  ASSERT_EQ(binding::AsNarrowArray(pointer.get(), buffer.data(), buffer.size()), binding::STATUS_OK);
+  EXPECT_STREQ(buffer.data(), "pointed");
+}
+
+TEST(AsNarrowString, CopiesOnlyWhenAskedTo) {
+  PyRef object = Eval("'ab'");
+  char* address = nullptr;
+  size_t length = 0;
+  int mark = 0;
+  ASSERT_EQ(binding::AsNarrowString(object.get(), &address, &length, &mark), binding::STATUS_OK);
+  EXPECT_EQ(address, PyString_AS_STRING(object.get()));
+  EXPECT_EQ(length, 3u);
+  mark = binding::NEWOBJ;
+  ASSERT_EQ(binding::AsNarrowString(object.get(), &address, &length, &mark), binding::STATUS_OK);
+  std::unique_ptr<char[]> copy(address);
+  EXPECT_NE(address, PyString_AS_STRING(object.get()));
+  EXPECT_STREQ(address, "ab");
+  EXPECT_EQ(mark, binding::NEWOBJ);
+}
+
+struct WideCase {
+  const char* expression;
+  const wchar_t* text;
+  int mark;
+};
+
+class AsWideStringCases : public ::testing::TestWithParam<WideCase> {};
+
+TEST_P(AsWideStringCases, CopiesTextObjects) {
+  PyRef object = Eval(GetParam().expression);
+  ASSERT_TRUE(object) << TakeError();
+  wchar_t* address = nullptr;
+  int mark = -1;
+  ASSERT_EQ(binding::AsWideString(object.get(), &address, nullptr, &mark), binding::STATUS_OK);
+  std::unique_ptr<wchar_t[]> copy(mark == binding::NEWOBJ ? address : nullptr);
+  EXPECT_EQ(mark, GetParam().mark);
+  if (GetParam().text) {
+    EXPECT_STREQ(address, GetParam().text);
+  } else {
+    EXPECT_EQ(address, nullptr);
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Kinds, AsWideStringCases,
+    ::testing::Values(WideCase{"u''", L"", binding::NEWOBJ},
+                      WideCase{"u'caf\\xe9 \\U0001f600'", L"caf\u00e9 \U0001F600", binding::NEWOBJ},
+                      WideCase{"'plain'", L"plain", binding::NEWOBJ},
+                      WideCase{"u'cut\\0here'", L"cut", binding::NEWOBJ},
+                      WideCase{"None", nullptr, -1}));
+
+TEST(AsWideString, TakesTheStringBehindAWideCharPointerWithoutCopying) {
+  wchar_t text[] = L"pointed";
+  PyRef pointer(PointerTo(text, TestType::WChar));
+  wchar_t* address = nullptr;
+  int mark = 0;
+  ASSERT_EQ(binding::AsWideString(pointer.get(), &address, nullptr, &mark), binding::STATUS_OK);
+  EXPECT_EQ(address, text);
+  EXPECT_EQ(mark, 0);
+}
+
+TEST(AsWideString, RefusesOtherObjectsAndKeepsDecodingErrors) {
+  char text[] = "narrow";
+  PyRef narrowPointer(PointerTo(text, TestType::Char));
+  for (const char* expression : {"5", "[]"}) {
+    PyRef object = Eval(expression);
+    EXPECT_EQ(binding::AsWideString(object.get(), nullptr, nullptr, nullptr),
+              binding::STATUS_TYPE_ERROR);
+    EXPECT_EQ(TakeError(), "");
+  }
+  EXPECT_EQ(binding::AsWideString(narrowPointer.get(), nullptr, nullptr, nullptr),
+            binding::STATUS_TYPE_ERROR);
+  PyRef undecodable = Eval("'\\xff'");
+  EXPECT_EQ(binding::AsWideString(undecodable.get(), nullptr, nullptr, nullptr),
+            binding::STATUS_TYPE_ERROR);
+  EXPECT_EQ(TakeError().rfind("UnicodeDecodeError: ", 0), 0u);
+}
+
+TEST(ResultConversions, UnsignedBecomesIntOrLong) {
+  struct Case {
+    uint32_t value;
+    const char* type;
+    const char* text;
+  };
+  for (const Case& c : {Case{0, "int", "0"}, Case{0x7FFFFFFF, "int", "2147483647"},
+                        Case{0x80000000, "long", "2147483648"},
+                        Case{0xFFFFFFFF, "long", "4294967295"}}) {
+    PyRef result(binding::FromUnsigned(c.value));
+    PyRef text(PyObject_Str(result.get()));
+    EXPECT_STREQ(Py_TYPE(result.get())->tp_name, c.type);
+    EXPECT_STREQ(PyString_AsString(text.get()), c.text);
+  }
+}
+
+TEST(ResultConversions, NarrowArrayKeepsInnerZerosAndDropsTrailingOnes) {
+  const char bytes[8] = {'a', '\0', 'b', '\0', '\0'};
+  size_t size = binding::TrimTrailingZeros(bytes, sizeof bytes);
+  EXPECT_EQ(size, 3u);
+  PyRef result(binding::FromNarrowArray(bytes, size));
+  EXPECT_EQ(std::string(PyString_AS_STRING(result.get()), PyString_GET_SIZE(result.get())),
+            std::string("a\0b", 3));
+  EXPECT_EQ(binding::TrimTrailingZeros(bytes + 3, 5), 0u);
+}
+
+TEST(ErrorTypeForCode, MapsEveryCode) {
+  struct Case {
+    int code;
+    PyObject* type;
+  };
+  for (const Case& c : {Case{-12, PyExc_MemoryError}, Case{-11, PyExc_AttributeError},
+                        Case{-10, PyExc_SystemError}, Case{-9, PyExc_ValueError},
+                        Case{-8, PyExc_SyntaxError}, Case{-7, PyExc_OverflowError},
+                        Case{-6, PyExc_ZeroDivisionError}, Case{-5, PyExc_TypeError},
+                        Case{-4, PyExc_IndexError}, Case{-2, PyExc_IOError},
+                        Case{-3, PyExc_RuntimeError}, Case{-1, PyExc_RuntimeError},
+                        Case{0, PyExc_RuntimeError}, Case{-13, PyExc_RuntimeError}}) {
+    EXPECT_EQ(binding::ErrorTypeForCode(c.code), c.type) << c.code;
+  }
+}
+
+}  // namespace
