@@ -2,7 +2,6 @@
 
 #include <cinttypes>
 #include <cstdio>
-#include <cstring>
 #include <string>
 
 #include "module/runtime/ClassData.h"

@@ -4,7 +4,6 @@
 #include <gtest/gtest.h>
 
 #include <array>
-#include <cstring>
 #include <memory>
 #include <string>
 
@@ -97,22 +96,6 @@ TEST(AsNarrowArray, TakesTheStringBehindACharPointer) {
   EXPECT_STREQ(buffer.data(), "pointed");
 }
 
-TEST(AsNarrowString, CopiesOnlyWhenAskedTo) {
-  PyRef object = Eval("'ab'");
-  char* address = nullptr;
-  size_t length = 0;
-  int mark = 0;
-  ASSERT_EQ(binding::AsNarrowString(object.get(), &address, &length, &mark), binding::STATUS_OK);
-  EXPECT_EQ(address, PyString_AS_STRING(object.get()));
-  EXPECT_EQ(length, 3u);
-  mark = binding::NEWOBJ;
-  ASSERT_EQ(binding::AsNarrowString(object.get(), &address, &length, &mark), binding::STATUS_OK);
-  std::unique_ptr<char[]> copy(address);
-  EXPECT_NE(address, PyString_AS_STRING(object.get()));
-  EXPECT_STREQ(address, "ab");
-  EXPECT_EQ(mark, binding::NEWOBJ);
-}
-
 struct WideCase {
   const char* expression;
   const wchar_t* text;
@@ -195,22 +178,6 @@ TEST(ResultConversions, NarrowArrayKeepsInnerZerosAndDropsTrailingOnes) {
   EXPECT_EQ(std::string(PyString_AS_STRING(result.get()), PyString_GET_SIZE(result.get())),
             std::string("a\0b", 3));
   EXPECT_EQ(binding::TrimTrailingZeros(bytes + 3, 5), 0u);
-}
-
-TEST(ErrorTypeForCode, MapsEveryCode) {
-  struct Case {
-    int code;
-    PyObject* type;
-  };
-  for (const Case& c : {Case{-12, PyExc_MemoryError}, Case{-11, PyExc_AttributeError},
-                        Case{-10, PyExc_SystemError}, Case{-9, PyExc_ValueError},
-                        Case{-8, PyExc_SyntaxError}, Case{-7, PyExc_OverflowError},
-                        Case{-6, PyExc_ZeroDivisionError}, Case{-5, PyExc_TypeError},
-                        Case{-4, PyExc_IndexError}, Case{-2, PyExc_IOError},
-                        Case{-3, PyExc_RuntimeError}, Case{-1, PyExc_RuntimeError},
-                        Case{0, PyExc_RuntimeError}, Case{-13, PyExc_RuntimeError}}) {
-    EXPECT_EQ(binding::ErrorTypeForCode(c.code), c.type) << c.code;
-  }
 }
 
 }  // namespace
