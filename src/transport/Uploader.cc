@@ -43,19 +43,24 @@ std::uint32_t NextChunkSize(std::uint32_t chunk, std::uint32_t writeMs) {
   return chunk;
 }
 
+// What one progress event tells beyond the byte counts.
+struct Estimate {
+  std::uint32_t fileLeft;
+  std::uint32_t allLeft;
+  std::uint32_t speed;
+};
+
+// Times left at that speed: for this file's remaining bytes and for all files'.
+Estimate Remaining(std::uint32_t fileBytes, std::uint32_t allBytes, std::uint32_t speed) {
+  return Estimate{Divide(fileBytes, speed), Divide(allBytes, speed), speed};
+}
+
 }  // namespace
 
 // Bytes of all files: sent so far, and in all.
 struct Uploader::Totals {
   std::uint32_t sent = 0;
   std::uint32_t size = 0;
-};
-
-// What one progress event tells beyond the byte counts.
-struct Estimate {
-  std::uint32_t fileLeft;
-  std::uint32_t allLeft;
-  std::uint32_t speed;
 };
 
 Uploader::Uploader(UploadProgress* listener, UploadRequest* request, UploadResult* result)
@@ -152,8 +157,7 @@ win::Status Uploader::WriteFilePart(UploadConnection& connection, const std::str
 win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstring& path,
                                  file::File& source, std::uint32_t size, Totals& totals) {
   const wchar_t* name = path.c_str();
-  Estimate estimate{Divide(size, request->rateEstimate), Divide(totals.size, request->rateEstimate),
-                    request->rateEstimate};
+  Estimate estimate = Remaining(size, totals.size, request->rateEstimate);
   std::uint32_t sent = 0;
   const std::uint32_t startTick = CurrentTick();
   std::uint32_t lastTick = startTick;
@@ -187,9 +191,7 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
     environment_.sleep(kPauseAfterChunkMs);
     const std::uint32_t now = CurrentTick();
     if (now != lastTick) {
-      estimate.speed = Divide(sent, now - startTick);
-      estimate.fileLeft = Divide(size - sent, estimate.speed);
-      estimate.allLeft = Divide(totals.size - totals.sent, estimate.speed);
+      estimate = Remaining(size - sent, totals.size - totals.sent, Divide(sent, now - startTick));
       report(sent);
       lastTick = now;
     }

@@ -129,10 +129,9 @@ class LoopbackServer {
     const auto deadline = std::chrono::steady_clock::now() + kGiveUp;
     while (!stop_ && std::chrono::steady_clock::now() < deadline) {
       if (!WaitReadable(connection)) continue;
-      char buffer[65536];
-      const ssize_t got = ::recv(connection, buffer, sizeof buffer, 0);
+      const ssize_t got = ::recv(connection, buffer_.data(), buffer_.size(), 0);
       if (got <= 0) return false;
-      received->append(buffer, static_cast<std::size_t>(got));
+      received->append(buffer_.data(), static_cast<std::size_t>(got));
       return true;
     }
     return false;
@@ -160,6 +159,7 @@ class LoopbackServer {
   std::condition_variable done_;
   std::size_t served_ = 0;
   std::vector<std::string> requests_;
+  std::vector<char> buffer_ = std::vector<char>(1 << 20);
   std::thread thread_;
 };
 
