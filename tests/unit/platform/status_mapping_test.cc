@@ -1,7 +1,5 @@
-#include <curl/curl.h>
 #include <gtest/gtest.h>
 
-#include <cerrno>
 #include <cstdint>
 #include <filesystem>
 #include <fstream>
@@ -23,18 +21,6 @@ TEST(StatusFromWin32, KeepsLowSixteenBitsOfPositiveCodesAndPassesTheRest) {
                        Case{0x80004005u, 0x80004005u}}) {
     EXPECT_EQ(static_cast<std::uint32_t>(win::StatusFromWin32(c.code)), c.status) << c.code;
   }
-}
-
-TEST(Win32Codes, ErrnoAndCurlFailuresMapToTheirNearestWindowsCodes) {
-  EXPECT_EQ(win::Win32FromErrno(ENOENT), 2u);
-  EXPECT_EQ(win::Win32FromErrno(ENOTDIR), 3u);
-  EXPECT_EQ(win::Win32FromErrno(EACCES), 5u);
-  EXPECT_EQ(win::Win32FromErrno(EISDIR), 5u);
-  EXPECT_EQ(win::Win32FromCurl(CURLE_OK), 0u);
-  EXPECT_EQ(win::Win32FromCurl(CURLE_COULDNT_CONNECT), 12029u);
-  EXPECT_EQ(win::Win32FromCurl(CURLE_OPERATION_TIMEDOUT), 12002u);
-  EXPECT_EQ(win::Win32FromCurl(CURLE_COULDNT_RESOLVE_HOST), 12007u);
-  EXPECT_EQ(win::Win32FromCurl(CURLE_PEER_FAILED_VERIFICATION), 12045u);
 }
 
 class LocalFile : public ::testing::Test {
