@@ -1,0 +1,76 @@
+#include "service/exchange.h"
+
+#include <new>
+
+#include "platform/http.h"
+#include "platform/text.h"
+
+namespace service {
+namespace {
+
+constexpr char kHexDigits[] = "0123456789ABCDEF";
+constexpr unsigned char kFirstPrintable = 0x21;  // space and controls lie below
+constexpr unsigned char kDelete = 0x7F;          // it and every non-ASCII byte lie above
+constexpr char kFragmentMark = '#';
+
+http::Scheme SchemeOf(Transport transport) {
+  return transport == Transport::kTls ? http::Scheme::kHttps : http::Scheme::kHttp;
+}
+
+std::uint16_t PortOf(Transport transport) {
+  return transport == Transport::kTls ? http::kHttpsPort : http::kHttpPort;
+}
+
+bool SendRequest(http::Request& request, const ServiceRequest& what) {
+  if (!what.headers.empty() && win::Failed(request.AddHeaders(what.headers))) return false;
+  return !win::Failed(request.Send(what.body));
+}
+
+// The service's three readings differ only in how much of a body that WinInet
+// had not yet received they would see. libcurl hands over the body framed by its
+// announced length, its chunks or the connection's end, so each takes it whole.
+std::string ReadReply(const http::Request& request, ReplyRead) { return request.body(); }
+
+std::string_view UpToZero(std::string_view bytes) { return bytes.substr(0, bytes.find('\0')); }
+
+bool MayNotStandInTarget(unsigned char byte) {
+  return byte < kFirstPrintable || byte >= kDelete || byte == kFragmentMark;
+}
+
+}  // namespace
+
+std::optional<std::string> RunExchange(const ServiceRequest& what) {
+  try {
+    const http::Session session(what.agent);
+    const http::Connection connection(session, text::WideToUtf8(what.host),
+                                      PortOf(what.transport), SchemeOf(what.transport));
+    http::Request request(connection, what.verb, text::WideToUtf8(what.path));
+    if (!SendRequest(request, what)) return std::nullopt;
+    return ReadReply(request, what.read);
+  } catch (const std::bad_alloc&) {
+    return std::nullopt;
+  }
+}
+
+std::wstring DecodeUtf8Reply(std::string_view bytes) {
+  return text::Utf8ToWide(UpToZero(bytes));
+}
+
+std::wstring DecodeAnsiReply(std::string_view bytes) { return DecodeUtf8Reply(bytes); }
+
+std::wstring EscapePathValue(std::wstring_view value) {
+  std::wstring escaped;
+  for (const char c : text::WideToUtf8(value)) {
+    const auto byte = static_cast<unsigned char>(c);
+    if (!MayNotStandInTarget(byte)) {
+      escaped += static_cast<wchar_t>(byte);
+      continue;
+    }
+    escaped += L'%';
+    escaped += static_cast<wchar_t>(kHexDigits[byte >> 4]);
+    escaped += static_cast<wchar_t>(kHexDigits[byte & 0xF]);
+  }
+  return escaped;
+}
+
+}  // namespace service

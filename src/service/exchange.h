@@ -1,0 +1,50 @@
+// One exchange with the community service, written once for every operation:
+// open a session, connect to the host, open the request, send it, read the
+// reply, close everything in reverse order (the handles' destructors do, on
+// every path). Internet errors end the exchange with no reply and no trace line.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace service {
+
+// How an operation takes the reply body. This transport frames every body (an
+// announced length, chunks or the end of the connection), so each reading gets
+// the whole body; a body longer than its announced length is cut there.
+enum class ReplyRead { kByLength, kAvailable, kToEnd };
+
+enum class Transport {
+  kHttp,  // port 80
+  kTls,   // port 443; the certificate's issuer, name and dates are all verified
+};
+
+struct ServiceRequest {
+  std::wstring host;  // a bare host name
+  Transport transport = Transport::kHttp;
+  std::string verb = "POST";
+  std::wstring path;    // the object path with its query; values already escaped
+  std::string agent;    // empty: no User-Agent of the session's own
+  std::string headers;  // header lines separated by LF
+  std::string body;
+  ReplyRead read = ReplyRead::kByLength;
+};
+
+// The reply body, whatever the HTTP status; nothing when an internet error
+// ended the exchange or the reply could not be read (one announcing more than
+// http::kMaxReplyBytes included).
+std::optional<std::string> RunExchange(const ServiceRequest& request);
+
+// The reply bytes up to the first zero byte, as text for the XML reader.
+std::wstring DecodeUtf8Reply(std::string_view bytes);
+// The same for replies in the thread's ANSI code page, which is UTF-8 here.
+std::wstring DecodeAnsiReply(std::string_view bytes);
+
+// A query value made fit to stand in a request target: its UTF-8 bytes that may
+// not (controls, space, DEL, non-ASCII) and "#", which would end the target, are
+// percent-encoded; "&", "=", "%" and every other printable byte stay as they are.
+std::wstring EscapePathValue(std::wstring_view value);
+
+}  // namespace service
