@@ -46,6 +46,7 @@
 #include "module/function_table.h"
 
 #include "module/functions_OBLoginData.h"
+#include "module/functions_PyPresetUploader.h"
 #include "module/functions_infoEffectURL.h"
 
 namespace module {
@@ -95,13 +96,13 @@ PyMethodDef g_functions[] = {
     Entry("OBLoginData_m_szChkServerUrl_set", OBLoginData_m_szChkServerUrl_set),  // 36
     Entry("OBLoginData_m_szChkServerUrl_get", OBLoginData_m_szChkServerUrl_get),  // 37
     Entry("OBLoginData_swigregister", OBLoginData_swigregister),  // 38
-    // 39 new_PyPresetUploader
-    // 40 delete_PyPresetUploader
-    // 41 PyPresetUploader_SetCallback
-    // 42 PyPresetUploader_StartUpload
-    // 43 PyPresetUploader_CancelUpload
-    // 44 PyPresetUploader_GetUploadedFileUrl
-    // 45 PyPresetUploader_swigregister
+    Entry("new_PyPresetUploader", new_PyPresetUploader),                                // 39
+    Entry("delete_PyPresetUploader", delete_PyPresetUploader),                          // 40
+    Entry("PyPresetUploader_SetCallback", PyPresetUploader_SetCallback),                // 41
+    Entry("PyPresetUploader_StartUpload", PyPresetUploader_StartUpload),                // 42
+    Entry("PyPresetUploader_CancelUpload", PyPresetUploader_CancelUpload),              // 43
+    Entry("PyPresetUploader_GetUploadedFileUrl", PyPresetUploader_GetUploadedFileUrl),  // 44
+    Entry("PyPresetUploader_swigregister", PyPresetUploader_swigregister),              // 45
     {nullptr, nullptr, 0, nullptr},
 };
 

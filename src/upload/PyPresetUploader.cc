@@ -1,0 +1,220 @@
+#include <Python.h>
+
+#include "upload/PyPresetUploader.h"
+
+#include <new>
+#include <string_view>
+
+#include "diag/trace.h"
+#include "platform/file.h"
+#include "platform/text.h"
+#include "platform/xml.h"
+#include "service/unescape_url.h"
+#include "transport/WideToUtf8.h"
+#include "upload/AllowThreadsGuard.h"
+#include "upload/OnInterpreterMainThread.h"
+
+namespace {
+
+constexpr char kTraceName[] = "PyPresetUploader";
+constexpr char kUrlStart[] = "http://";
+constexpr char kUploadPath[] = "/servlet/uploadTemplate";
+// The upload URL is built in a buffer of 260 bytes, terminator included.
+constexpr std::size_t kUrlLimit = 259;
+
+constexpr char kUrlNode[] = "uploadTemplate/templateUrl";
+constexpr char kErrorNode[] = "uploadTemplate/errMsg";
+
+constexpr wchar_t kReportKind[] = L"PROGRESS";
+constexpr wchar_t kProgressEvent[] = L"ProgressChanged";
+constexpr wchar_t kCompleteEvent[] = L"UploadComplete";
+constexpr char kProgressFormat[] = "uuii";
+constexpr char kCompleteFormat[] = "uuiiuu";
+constexpr int kComplete = 100;
+
+// The preset file and the first four images must exist before anything starts.
+constexpr std::size_t kRequiredImages = 4;
+
+constexpr std::uint32_t kStatusClass = 100;
+constexpr std::uint32_t kSuccessClass = 2;
+
+// Narrow texts of this platform are UTF-8 in every code page.
+std::string Narrow(const wchar_t* text) { return text::WideToUtf8(text::WideView(text)); }
+
+// A field value in UTF-8; null (sent empty) when there is no text.
+std::unique_ptr<char[]> FieldValue(const wchar_t* text) {
+  char* value = nullptr;
+  if (!WideToUtf8(text, &value)) return nullptr;
+  return std::unique_ptr<char[]>(value);
+}
+
+bool FileGiven(const wchar_t* path) { return path != nullptr && file::PathExists(path); }
+
+// Whole percent of the bytes sent; nothing to send counts as all sent.
+int Percentage(std::uint32_t sent, std::uint32_t total) {
+  if (total == 0) return kComplete;
+  return static_cast<int>(static_cast<float>(sent) / static_cast<float>(total) * 100.0);
+}
+
+}  // namespace
+
+PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* token,
+                                   const wchar_t* version, const wchar_t* versionType,
+                                   const wchar_t* uuid)
+    : serverHost(Narrow(serverHost)),
+      token(Narrow(token)),
+      uuid(Narrow(uuid)),
+      version(Narrow(version)),
+      versionType(Narrow(versionType)) {
+  TraceSetPrefix(kTraceName);
+}
+
+PyPresetUploader::~PyPresetUploader() {
+  cancelRequested = true;
+  JoinWorker();
+  DestroyProxyWindow();
+}
+
+int PyPresetUploader::SetCallback(PyObject* callable) {
+  PyCallback::SetCallback(callable);
+  return 1;
+}
+
+int PyPresetUploader::StartUpload(
+    const wchar_t* presetFile, const wchar_t* image1, const wchar_t* image2, const wchar_t* image3,
+    const wchar_t* image4, const wchar_t* image5, const wchar_t* image6, const wchar_t* image7,
+    const wchar_t* image8, const wchar_t* image9, const wchar_t* image10, const wchar_t* image11,
+    const wchar_t* image12, const wchar_t* templateKey, const wchar_t* title,
+    const wchar_t* category, const wchar_t* tags, const wchar_t* description) {
+  const Images images{image1, image2, image3, image4,  image5,  image6,
+                      image7, image8, image9, image10, image11, image12};
+  if (!CanStartUpload(presetFile, images) || !SetUploadUrl()) return 0;
+  cancelRequested = false;
+  uploadedUrl.clear();
+  // An upload that ends before any status arrives must not report an earlier one's.
+  uploadResult = UploadResult{};
+  uploadRequest.ClearFields();
+  uploadRequest.ClearFiles();
+  AddTextFields(Texts{templateKey, title, category, tags, description});
+  AddFileFields(presetFile, images);
+  return StartWorker() ? 1 : 0;
+}
+
+// The reports of a window reach Python only on the interpreter's main thread,
+// and the form must not change under a running worker.
+bool PyPresetUploader::CanStartUpload(const wchar_t* presetFile, const Images& images) const {
+  if (uploadThread || !OnInterpreterMainThread()) return false;
+  if (!FileGiven(presetFile)) return false;
+  for (std::size_t i = 0; i < kRequiredImages; ++i) {
+    if (!FileGiven(images[i])) return false;
+  }
+  return true;
+}
+
+// A host that gives no acceptable URL leaves the form as it was.
+bool PyPresetUploader::SetUploadUrl() {
+  const std::string url = kUrlStart + serverHost + kUploadPath;
+  return url.size() <= kUrlLimit && uploadRequest.SetUrl(url.c_str());
+}
+
+// Title, tags, description, category and template key: UTF-8 on this platform
+// whatever their code page.
+void PyPresetUploader::AddTextFields(const Texts& texts) {
+  uploadRequest.AddField("token", token.c_str());
+  uploadRequest.AddField("title", FieldValue(texts.title).get());
+  uploadRequest.AddField("tags", FieldValue(texts.tags).get());
+  uploadRequest.AddField("description", FieldValue(texts.description).get());
+  uploadRequest.AddField("category", FieldValue(texts.category).get());
+  uploadRequest.AddField("templatetype", "PRESET");
+  uploadRequest.AddField("PIPtype", "0");
+  uploadRequest.AddField("templateKey", FieldValue(texts.templateKey).get());
+  uploadRequest.AddField("AspectRatio", "1:1");
+  uploadRequest.AddField("productName", "Quillmark Lumivanta");
+  uploadRequest.AddField("AP", "KRV");
+  uploadRequest.AddField("versionInfo", version.c_str());
+  uploadRequest.AddField("Version", version.c_str());
+  uploadRequest.AddField("versionType", versionType.c_str());
+  uploadRequest.AddField("uuid", uuid.c_str());
+}
+
+// The first image goes twice: as the cover and as the first of the twelve.
+void PyPresetUploader::AddFileFields(const wchar_t* presetFile, const Images& images) {
+  uploadRequest.AddFile(L"PIPfile", presetFile);
+  uploadRequest.AddFile(L"PIPimg", images[0]);
+  for (std::size_t i = 0; i < images.size(); ++i) {
+    uploadRequest.AddFile((L"PIPimg_" + std::to_wstring(i + 1)).c_str(), images[i]);
+  }
+}
+
+bool PyPresetUploader::StartWorker() {
+  proxyWindow = std::make_unique<CUploadProgressProxyWindow>(this);
+  // The two request notifications would only cost the UI thread work.
+  proxyWindow->SetEventFilter(proxyWindow->GetEventFilter() &
+                              ~(CUploadProgressProxyWindow::kForwardSendingRequest |
+                                CUploadProgressProxyWindow::kForwardRequestSent));
+  if (proxyWindow->CreateHiddenWindow()) {
+    uploadThread.reset(new (std::nothrow)
+                           UploadThread2(&uploadRequest, &uploadResult, proxyWindow.get()));
+    if (uploadThread && uploadThread->Start()) return true;
+  }
+  uploadThread.reset();
+  DestroyProxyWindow();
+  return false;
+}
+
+// Other Python threads may run while this waits.
+std::string PyPresetUploader::JoinWorker() {
+  if (!uploadThread) return {};
+  {
+    AllowThreadsGuard unlocked;
+    uploadThread->Join();
+  }
+  std::string reply = uploadThread->GetReply();
+  uploadThread.reset();
+  return reply;
+}
+
+void PyPresetUploader::DestroyProxyWindow() {
+  if (!proxyWindow) return;
+  proxyWindow->DestroyWindow();
+  proxyWindow.reset();
+}
+
+void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32_t,
+                                      std::uint32_t fileTimeLeft, std::uint32_t allSent,
+                                      std::uint32_t allSize, std::uint32_t, std::uint32_t) {
+  Call(kProgressFormat, kReportKind, kProgressEvent, Percentage(allSent, allSize),
+       static_cast<int>(fileTimeLeft));
+}
+
+// Runs inside the proxy window's own command handler; the callable, called
+// last, may even destroy this object.
+void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
+  TraceMessage(L"PyPresetUploader::OnBackgroundUploadComplete");
+  uploadedUrl.clear();
+  const std::string reply = JoinWorker();
+  const std::wstring errorText = reply.empty() ? std::wstring() : ReadReply(reply);
+  DestroyProxyWindow();
+  Call(kCompleteFormat, kReportKind, kCompleteEvent, kComplete, Succeeded() ? 1 : 0,
+       uploadedUrl.c_str(), errorText.c_str());
+}
+
+// Keeps the decoded URL of the published preset; returns the server's error
+// text, whole.
+std::wstring PyPresetUploader::ReadReply(const std::string& reply) {
+  const xml::Document document(text::Utf8ToWide(reply));
+  const xml::Lookup url = document.NodeText(kUrlNode);
+  if (url.found()) uploadedUrl = UnescapeUrl(url.text);
+  const xml::Lookup error = document.NodeText(kErrorNode);
+  if (error.failed()) TraceMessage(L"Upload OB fail: Can not parse errMsg from xml.");
+  return error.found() ? error.text : std::wstring();
+}
+
+// A 2xx status; no status at all (0xFFFFFFFF) is a failure.
+bool PyPresetUploader::Succeeded() const {
+  return uploadResult.httpStatus / kStatusClass == kSuccessClass;
+}
+
+PyObject* PyPresetUploader::GetUploadedFileUrl() const {
+  return Py_BuildValue("u", uploadedUrl.c_str());
+}

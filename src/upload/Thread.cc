@@ -1,0 +1,44 @@
+#include "upload/Thread.h"
+
+#include <system_error>
+
+Thread::~Thread() {
+  if (handle.joinable()) handle.join();
+}
+
+bool Thread::Start() {
+  try {
+    handle = std::thread(&Thread::ThreadEntry, this);
+  } catch (const std::system_error&) {
+    return false;
+  }
+  threadId = handle.get_id();
+  OpenStartGate();
+  return true;
+}
+
+std::uint32_t Thread::ThreadEntry(Thread* thread) {
+  thread->WaitAtStartGate();
+  thread->exitCode = thread->Run();
+  return thread->exitCode;
+}
+
+std::uint32_t Thread::Join() {
+  if (!handle.joinable()) return 0;
+  handle.join();
+  handle = std::thread();
+  return exitCode;
+}
+
+void Thread::OpenStartGate() {
+  {
+    std::lock_guard<std::mutex> lock(startGate.mutex);
+    startGate.open = true;
+  }
+  startGate.opened.notify_one();
+}
+
+void Thread::WaitAtStartGate() {
+  std::unique_lock<std::mutex> lock(startGate.mutex);
+  startGate.opened.wait(lock, [this] { return startGate.open; });
+}

@@ -1,0 +1,31 @@
+// The worker of one preset upload: runs the upload engine over a prepared form,
+// keeps the server's reply and reports the completion to its listener.
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+#include "upload/Thread.h"
+
+class BackgroundUploadProgress;
+class UploadRequest;
+struct UploadResult;
+
+class UploadThread2 : public Thread {
+ public:
+  // None of the three is owned; all must outlive the thread's run.
+  UploadThread2(UploadRequest* request, UploadResult* result, BackgroundUploadProgress* listener);
+  ~UploadThread2() override = default;
+
+  // The server's reply body; read it only after Join has returned.
+  std::string GetReply() const { return reply; }
+
+ protected:
+  std::uint32_t Run() override;
+
+ private:
+  UploadRequest* request;
+  UploadResult* result;
+  BackgroundUploadProgress* listener;
+  std::string reply;
+};
