@@ -58,10 +58,4 @@ TEST_F(UploaderReportsTest, ACompletionWithoutAStatusOrReplyIsAFailureWithEmptyT
   EXPECT_EQ(PyUnicode_GetSize(url.get()), 0);
 }
 
-TEST_F(UploaderReportsTest, NoneUnregistersTheCallable) {
-  EXPECT_EQ(uploader.SetCallback(Py_None), 1);
-  uploader.OnFileProgress(L"/tmp/p", 1, 2, 3, 4, 5, 6, 7);
-  EXPECT_EQ(EvalRepr("reports"), "[]");
-}
-
 }  // namespace
