@@ -1,0 +1,25 @@
+#include "service/server_request.h"
+
+std::wstring QueryPath(std::wstring_view servlet, std::initializer_list<QueryField> fields) {
+  std::wstring path(servlet);
+  wchar_t separator = L'?';
+  for (const auto& [name, value] : fields) {
+    path += separator;
+    path += name;
+    path += L'=';
+    path += service::EscapePathValue(value);
+    separator = L'&';
+  }
+  return path;
+}
+
+std::optional<std::wstring> PostToServer(const std::wstring& host, const std::wstring& path,
+                                         service::ReplyRead read, ReplyCoding coding) {
+  service::ServiceRequest request;
+  request.host = host;
+  request.path = path;
+  request.read = read;
+  const std::optional<std::string> reply = service::RunExchange(request);
+  if (!reply) return std::nullopt;
+  return coding == ReplyCoding::kUtf8 ? service::DecodeUtf8Reply(*reply) : service::DecodeAnsiReply(*reply);
+}
