@@ -69,10 +69,10 @@ PyMethodDef g_functions[] = {
     Entry("infoEffectURL_swigregister", infoEffectURL_swigregister),    // 9
     Entry("new_OBLoginData", new_OBLoginData),  // 10
     Entry("delete_OBLoginData", delete_OBLoginData),  // 11
-    // 12 OBLoginData_LoginOrbishare
-    // 13 OBLoginData_LogoutOrbishare
-    // 14 OBLoginData_InitOBServerURL
-    // 15 OBLoginData_SetOBURLAsReg
+    Entry("OBLoginData_LoginOrbishare", OBLoginData_LoginOrbishare),  // 12
+    Entry("OBLoginData_LogoutOrbishare", OBLoginData_LogoutOrbishare),  // 13
+    Entry("OBLoginData_InitOBServerURL", OBLoginData_InitOBServerURL),  // 14
+    Entry("OBLoginData_SetOBURLAsReg", OBLoginData_SetOBURLAsReg),  // 15
     Entry("OBLoginData_GetUserName", OBLoginData_GetUserName),  // 16
     Entry("OBLoginData_GetServerUrl", OBLoginData_GetServerUrl),  // 17
     Entry("OBLoginData_GetLoginTokenID", OBLoginData_GetLoginTokenID),  // 18

@@ -49,6 +49,30 @@ PyObject* delete_OBLoginData(PyObject*, PyObject* args) {
   return Delete<OBLoginData>(args, "delete_OBLoginData", Type(TypeId::OBLoginData), kSessionType);
 }
 
+PyObject* OBLoginData_LoginOrbishare(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_LoginOrbishare", ReturnsUnsigned{},
+              [](OBLoginData* self, const wchar_t* account, const wchar_t* password) {
+                return self->LoginOrbishare(account, password);
+              },
+              Session(), Unicode(), Unicode());
+}
+
+PyObject* OBLoginData_LogoutOrbishare(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_LogoutOrbishare", ReturnsNone{},
+              [](OBLoginData* self) { self->LogoutOrbishare(); }, Session());
+}
+
+PyObject* OBLoginData_InitOBServerURL(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_InitOBServerURL", ReturnsNone{},
+              [](OBLoginData* self) { self->InitOBServerURL(); }, Session());
+}
+
+PyObject* OBLoginData_SetOBURLAsReg(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_SetOBURLAsReg", ReturnsNone{},
+              [](OBLoginData* self, const wchar_t* serverHost) { self->SetOBURLAsReg(serverHost); },
+              Session(), Unicode());
+}
+
 PyObject* OBLoginData_GetUserName(PyObject*, PyObject* args) {
   return Call(args, "OBLoginData_GetUserName", PassedThrough{},
               [](OBLoginData* self) { return self->GetUserName(); }, Session());

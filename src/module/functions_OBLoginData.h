@@ -1,5 +1,5 @@
 // Module functions of the OBLoginData session: construction, the plain accessors
-// and the probe members (Nos. 10, 11, 16 to 18, 24, 28 to 38).
+// sign-in, discovery and the probe members (Nos. 10 to 18, 24, 28 to 38).
 #pragma once
 
 #include <Python.h>
@@ -8,6 +8,10 @@ namespace module {
 
 PyObject* new_OBLoginData(PyObject* self, PyObject* args);
 PyObject* delete_OBLoginData(PyObject* self, PyObject* args);
+PyObject* OBLoginData_LoginOrbishare(PyObject* self, PyObject* args);
+PyObject* OBLoginData_LogoutOrbishare(PyObject* self, PyObject* args);
+PyObject* OBLoginData_InitOBServerURL(PyObject* self, PyObject* args);
+PyObject* OBLoginData_SetOBURLAsReg(PyObject* self, PyObject* args);
 PyObject* OBLoginData_GetUserName(PyObject* self, PyObject* args);
 PyObject* OBLoginData_GetServerUrl(PyObject* self, PyObject* args);
 PyObject* OBLoginData_GetLoginTokenID(PyObject* self, PyObject* args);

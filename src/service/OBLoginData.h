@@ -14,6 +14,13 @@
 struct _object;
 typedef struct _object PyObject;
 
+namespace http {
+class Probe;
+}
+namespace xml {
+class Document;
+}
+
 typedef void* HINTERNET;  // a connection handle of the reachability probe
 typedef int BOOL;
 
@@ -42,6 +49,15 @@ class OBLoginData {
   // Service operations: each is defined in its own file of src/service/ and
   // declared here.
 
+  // Sign-in and sign-out (login.cc).
+  unsigned int LoginOrbishare(const wchar_t* account, const wchar_t* password);
+  void LogoutOrbishare();
+  // Server discovery (discovery.cc).
+  void InitOBServerURL();
+  void SetOBURLAsReg(const wchar_t* serverHost);
+  // The reachability probe (reachability.cc): nonzero when the URL could be opened.
+  BOOL CheckServerReachable(const char* url);
+
   // The reachability probe's state, also read and written from Python.
   HINTERNET m_hInternet;
   HINTERNET m_hConnect;
@@ -51,6 +67,14 @@ class OBLoginData {
 
  private:
   std::wstring DefaultLink(const wchar_t* path) const;
+  // Makes the server host known: detection once, else the staging host.
+  void EnsureServerUrl();
+  void DetectServerInfo();
+  void StoreServiceInfo(const xml::Document& reply);
+  void ProbeThreadProc(http::Probe& probe);
+  // Stores what a sign-in reply carries but the token; returns 1 with the token.
+  unsigned int ReadSignInReply(const xml::Document& reply, std::wstring& token,
+                               bool& firstLogin);
 
   BOOL m_bLoggedIn;
   std::wstring m_strServerUrl;  // bare host name of every service request

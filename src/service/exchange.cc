@@ -4,11 +4,11 @@
 
 #include "platform/http.h"
 #include "platform/text.h"
+#include "service/percent_encoding.h"
 
 namespace service {
 namespace {
 
-constexpr char kHexDigits[] = "0123456789ABCDEF";
 constexpr unsigned char kFirstPrintable = 0x21;  // space and controls lie below
 constexpr unsigned char kDelete = 0x7F;          // it and every non-ASCII byte lie above
 constexpr char kFragmentMark = '#';
@@ -59,18 +59,7 @@ std::wstring DecodeUtf8Reply(std::string_view bytes) {
 std::wstring DecodeAnsiReply(std::string_view bytes) { return DecodeUtf8Reply(bytes); }
 
 std::wstring EscapePathValue(std::wstring_view value) {
-  std::wstring escaped;
-  for (const char c : text::WideToUtf8(value)) {
-    const auto byte = static_cast<unsigned char>(c);
-    if (!MayNotStandInTarget(byte)) {
-      escaped += static_cast<wchar_t>(byte);
-      continue;
-    }
-    escaped += L'%';
-    escaped += static_cast<wchar_t>(kHexDigits[byte >> 4]);
-    escaped += static_cast<wchar_t>(kHexDigits[byte & 0xF]);
-  }
-  return escaped;
+  return PercentEncode(text::WideToUtf8(value), MayNotStandInTarget, kUpperHexDigits);
 }
 
 }  // namespace service

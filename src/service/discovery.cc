@@ -1,0 +1,83 @@
+// Server discovery: the service information from the detection host, asked for
+// once per session, with the staging host as the fallback server host.
+#include <string>
+
+#include "diag/trace.h"
+#include "platform/text.h"
+#include "platform/xml.h"
+#include "service/OBLoginData.h"
+#include "service/exchange.h"
+#include "upload/AllowThreadsGuard.h"
+
+namespace {
+
+constexpr wchar_t kDetectionPage[] = L"observer.jsp";
+constexpr char kDetectionVerb[] = "GET";
+
+// One field of the service information, in the order it is read.
+struct InfoField {
+  const char* path;
+  std::wstring OBLoginData::*member;
+  const wchar_t* storedLine;  // with the new value; null for none
+  const wchar_t* failedLine;  // when the query fails; null for none
+};
+
+}  // namespace
+
+void OBLoginData::InitOBServerURL() {
+  AllowThreadsGuard unlocked;
+  EnsureServerUrl();
+}
+
+void OBLoginData::SetOBURLAsReg(const wchar_t* serverHost) {
+  m_strServerUrl = text::WideView(serverHost);
+}
+
+void OBLoginData::EnsureServerUrl() {
+  if (!m_strServerUrl.empty()) return;
+  DetectServerInfo();
+  TraceMessage(L"Get OB server URL from server. URL = %s", m_strServerUrl.c_str());
+  if (m_strServerUrl.empty()) {
+    m_strServerUrl = m_hosts.stagingHost;
+    TraceMessage(L"Use static URL as OB server URL.");
+  }
+}
+
+void OBLoginData::DetectServerInfo() {
+  const std::string probeUrl = "http://" + text::WideToUtf8(m_hosts.detectionHost);
+  if (!CheckServerReachable(probeUrl.c_str())) return;
+
+  service::ServiceRequest request;
+  request.host = m_hosts.detectionHost;
+  request.verb = kDetectionVerb;
+  request.path = std::wstring(kDetectionPage) + L"?ap=lumivanta&version=" +
+                 service::EscapePathValue(m_strVersion);
+  if (!m_strVersionType.empty()) {
+    request.path += L"&versionType=" + service::EscapePathValue(m_strVersionType);
+  }
+  request.read = service::ReplyRead::kByLength;
+  const std::optional<std::string> reply = service::RunExchange(request);
+  if (reply) StoreServiceInfo(xml::Document(service::DecodeAnsiReply(*reply)));
+}
+
+void OBLoginData::StoreServiceInfo(const xml::Document& reply) {
+  const InfoField fields[] = {
+      {"INFO/APIUrl", &OBLoginData::m_strServerUrl, nullptr, nullptr},
+      {"INFO/AdjustmentPreset", &OBLoginData::m_strAdjustmentPresetURL, nullptr, nullptr},
+      {"INFO/SignUp", &OBLoginData::m_strSignUpURL, L"KRV SignUp = %s",
+       L"Update OBInfo fail: Can not parse SignUp from xml."},
+      {"INFO/ForgetPassword", &OBLoginData::m_strForgetPasswordURL, L"KRV ForgetPassword = %s",
+       L"Update OBInfo fail: Can not parse ForgetPassword from xml."},
+      {"INFO/LensCorrection", &OBLoginData::m_strLensCorrectionURL, L"KRV LensCorrection = %s",
+       L"Update OBInfo fail: Can not parse LensCorrection from xml."},
+      {"INFO/VideoGallery", &OBLoginData::m_strVideoGalleryURL, L"KRV VideoGallery = %s",
+       L"Update OBInfo fail: Can not parse VideoGallery from xml."},
+  };
+  for (const InfoField& field : fields) {
+    const xml::Lookup node = reply.NodeText(field.path);
+    if (node.failed() && field.failedLine) TraceMessage(field.failedLine);
+    if (!node.found()) continue;
+    this->*field.member = node.text;
+    if (field.storedLine) TraceMessage(field.storedLine, (this->*field.member).c_str());
+  }
+}
