@@ -10,9 +10,11 @@ import unittest
 import urllib
 from StringIO import StringIO
 
+import _PyUploader as native
+
 from refservice import SERVER_HOST, reply, xml_reply
 from upload_support import (INITIAL_RATE_ESTIMATE, MAIN_THREAD, OCTET_STREAM, SESSION, TEXTS,
-                            UPLOAD_PATH, PresetFiles, Reports, UploadTest, expected_body,
+                            UPLOAD_PATH, Reports, UploadTest, expected_body,
                             expected_fields, new_uploader, pump, wait_for_completion,
                             wait_for_progress)
 
@@ -49,7 +51,7 @@ class SuccessfulUpload(UploadTest):
                          (len(body), hashlib.sha256(body).hexdigest()))
 
     def test_progress_reaches_the_main_thread_rising_and_at_most_twice_a_second_per_file(self):
-        self.files = PresetFiles(preset_size=3 * 1024 * 1024)
+        self.replace_files(preset_size=3 * 1024 * 1024)
         self.slow_reader(2 * 1024 * 1024)
         began = time.time()
         self.start()
@@ -68,7 +70,7 @@ class SuccessfulUpload(UploadTest):
 
     def test_the_url_is_empty_during_the_upload_and_known_afterwards(self):
         self.assertEqual(self.uploader.GetUploadedFileUrl(), u'')
-        self.files = PresetFiles(preset_size=2 * 1024 * 1024)
+        self.replace_files(preset_size=2 * 1024 * 1024)
         self.slow_reader(1024 * 1024)
         self.start()
         wait_for_progress(self.reports)
@@ -80,7 +82,7 @@ class SuccessfulUpload(UploadTest):
         # The slow reader makes the first upload's files span half-seconds, so
         # a speed is measured and kept in the form.
         preset_size = 3 * 1024 * 1024
-        self.files = PresetFiles(preset_size=preset_size)
+        self.replace_files(preset_size=preset_size)
         self.slow_reader(2 * 1024 * 1024)
         self.start()
         self.assertEqual(wait_for_completion(self.reports)[3:5], (1, FIRST_URL))
@@ -198,7 +200,7 @@ class RefusedStarts(UploadTest):
         self.assertEqual(wait_for_completion(self.reports)[2:], (100, 0, u'', u''))
 
     def test_a_start_during_a_running_upload_changes_nothing(self):
-        self.files = PresetFiles(preset_size=2 * 1024 * 1024)
+        self.replace_files(preset_size=2 * 1024 * 1024)
         self.slow_reader(1024 * 1024)
         self.assertEqual(self.start(title=u'First'), 1)
         wait_for_progress(self.reports)
@@ -247,6 +249,50 @@ class Callables(UploadTest):
         self.assertEqual(self.reports.completions()[0][3:], (1, FIRST_URL, u''))
         self.assertEqual(printed.count('ZeroDivisionError: report'), len(self.reports.items))
         self.assertIn('ZeroDivisionError: report %d' % len(self.reports.items), printed)
+
+
+class ModuleFunctions(UploadTest):
+
+    def test_str_texts_are_accepted_as_well(self):
+        self.replace_files(prefix='preset-')
+        uploader = new_uploader(serverHost='api.orbishare.com', token='0123')
+        uploader.SetCallback(self.reports)
+        paths = [str(p) for p in [self.files.preset] + self.files.images]
+        texts = dict((name, str(value.encode('unicode_escape'))) for name, value in TEXTS.items())
+        self.assertEqual(self.start(uploader, preset=paths[0], images=paths[1:], **texts), 1)
+        self.assertEqual(wait_for_completion(self.reports)[3], 1)
+        upload = self.uploads()[0].upload
+        self.assertEqual((upload.field('title'), upload.field('token')), (texts['title'], '0123'))
+
+    def test_unusable_arguments_raise_the_modules_error_texts(self):
+        session = native.new_OBLoginData(u'5.0', u'', u'')
+        texts = [u''] * 18
+        cases = [
+            (native.PyPresetUploader_StartUpload, [self.uploader] + texts[:17] + [5],
+             TypeError, "in method 'PyPresetUploader_StartUpload', argument 19 of type "
+                        "'wchar_t const *'"),
+            (native.PyPresetUploader_CancelUpload, [session],
+             TypeError, "in method 'PyPresetUploader_CancelUpload', argument 1 of type "
+                        "'PyPresetUploader *'"),
+            (native.PyPresetUploader_GetUploadedFileUrl, [None],
+             ValueError, "invalid null reference in method 'PyPresetUploader_GetUploadedFileUrl', "
+                         "argument 1 of type 'PyPresetUploader *'"),
+            (native.new_PyPresetUploader, [u'', u'', 1.5, u'', u''],
+             TypeError, "in method 'new_PyPresetUploader', argument 3 of type 'wchar_t const *'"),
+        ]
+        for function, args, error, text in cases:
+            with self.assertRaises(error) as raised:
+                function(*args)
+            self.assertEqual(str(raised.exception), text)
+        native.delete_OBLoginData(session)
+
+    def test_results_of_the_plain_functions(self):
+        self.assertEqual(native.PyPresetUploader_SetCallback(self.uploader, None), 1)
+        self.assertIsNone(native.PyPresetUploader_CancelUpload(self.uploader))
+        self.assertIsNone(native.delete_PyPresetUploader(None))
+        bare = native.new_PyPresetUploader(None, None, None, None, None)
+        self.assertIn("<Swig Object of type 'PyPresetUploader *' at 0x", repr(bare))
+        self.assertIsNone(native.delete_PyPresetUploader(bare))
 
 
 if __name__ == '__main__':

@@ -5,7 +5,7 @@ import gc
 import sys
 import unittest
 
-from upload_support import (PresetFiles, Reports, UploadTest, pump, wait_for_completion,
+from upload_support import (Reports, UploadTest, pump, wait_for_completion,
                             wait_for_progress, worker_threads)
 
 LARGE_PRESET = 24 * 1024 * 1024
@@ -17,7 +17,7 @@ class CancelledUpload(UploadTest):
 
     def setUp(self):
         UploadTest.setUp(self)
-        self.files = PresetFiles(preset_size=LARGE_PRESET)
+        self.replace_files(preset_size=LARGE_PRESET)
         self.slow_reader(SLOW_READ)
 
     def test_a_cancel_while_streaming_completes_with_failure_and_nothing_after(self):
@@ -52,7 +52,7 @@ class DestroyedUploader(UploadTest):
 
     def setUp(self):
         UploadTest.setUp(self)
-        self.files = PresetFiles(preset_size=LARGE_PRESET)
+        self.replace_files(preset_size=LARGE_PRESET)
         self.slow_reader(SLOW_READ)
 
     def test_deleting_waits_for_the_worker_and_the_callable_hears_nothing_more(self):

@@ -5,7 +5,6 @@ while the main thread takes the reports.
 Reports reach the callable only while the main thread runs Python code, so
 every wait here is a loop of short sleeps.
 """
-import hashlib
 import os
 import shutil
 import tempfile
@@ -54,8 +53,8 @@ def expected_fields(session=SESSION, texts=TEXTS):
 class PresetFiles(object):
     """A preset file and twelve images of random bytes in a temporary folder."""
 
-    def __init__(self, preset_size=3000, image_sizes=None):
-        self.folder = tempfile.mkdtemp(prefix=u'preset-\xe9-')
+    def __init__(self, preset_size=3000, image_sizes=None, prefix=u'preset-\xe9-'):
+        self.folder = tempfile.mkdtemp(prefix=prefix)
         sizes = image_sizes or [1000 + 77 * i for i in range(IMAGE_COUNT)]
         self.preset = self._write(u'Golden hour.preset', preset_size)
         self.images = [self._write(u'preview_%02d.png' % (i + 1), size)
@@ -156,6 +155,10 @@ class UploadTest(unittest.TestCase):
     def tearDown(self):
         self.uploader = None
         self.files.remove()
+
+    def replace_files(self, **options):
+        self.files.remove()
+        self.files = PresetFiles(**options)
 
     def start(self, uploader=None, preset=DEFAULT, images=DEFAULT, **texts):
         uploader = uploader or self.uploader
