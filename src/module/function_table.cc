@@ -76,15 +76,15 @@ PyMethodDef g_functions[] = {
     Entry("OBLoginData_GetUserName", OBLoginData_GetUserName),  // 16
     Entry("OBLoginData_GetServerUrl", OBLoginData_GetServerUrl),  // 17
     Entry("OBLoginData_GetLoginTokenID", OBLoginData_GetLoginTokenID),  // 18
-    // 19 OBLoginData_GetSignUpURL
-    // 20 OBLoginData_GetForgetPasswordURL
-    // 21 OBLoginData_GetLensCorrectionURL
-    // 22 OBLoginData_GetPresetCategory
-    // 23 OBLoginData_GetCategroyName
+    Entry("OBLoginData_GetSignUpURL", OBLoginData_GetSignUpURL),  // 19
+    Entry("OBLoginData_GetForgetPasswordURL", OBLoginData_GetForgetPasswordURL),  // 20
+    Entry("OBLoginData_GetLensCorrectionURL", OBLoginData_GetLensCorrectionURL),  // 21
+    Entry("OBLoginData_GetPresetCategory", OBLoginData_GetPresetCategory),  // 22
+    Entry("OBLoginData_GetCategroyName", OBLoginData_GetCategroyName),  // 23
     Entry("OBLoginData_GetCategoryCount", OBLoginData_GetCategoryCount),  // 24
-    // 25 OBLoginData_SetRelateVideo
-    // 26 OBLoginData_GetPresetDownloadURL
-    // 27 OBLoginData_GetEffectByGUID
+    Entry("OBLoginData_SetRelateVideo", OBLoginData_SetRelateVideo),  // 25
+    Entry("OBLoginData_GetPresetDownloadURL", OBLoginData_GetPresetDownloadURL),  // 26
+    Entry("OBLoginData_GetEffectByGUID", OBLoginData_GetEffectByGUID),  // 27
     Entry("OBLoginData_m_hInternet_set", OBLoginData_m_hInternet_set),  // 28
     Entry("OBLoginData_m_hInternet_get", OBLoginData_m_hInternet_get),  // 29
     Entry("OBLoginData_m_hConnect_set", OBLoginData_m_hConnect_set),  // 30

@@ -15,6 +15,7 @@ namespace {
 using namespace binding;
 
 using HandleMember = HINTERNET OBLoginData::*;
+using LinkGetter = PyObject* (OBLoginData::*)();
 using UrlBuffer = std::array<char, kMaxPath>;
 
 constexpr char kSessionType[] = "OBLoginData *";
@@ -33,6 +34,12 @@ PyObject* SetHandle(PyObject* args, const char* function, HandleMember member) {
 PyObject* GetHandle(PyObject* args, const char* function, HandleMember member) {
   return Call(args, function, NewPointer(Type(TypeId::HINTERNET), POINTER_OWN),
               [member](OBLoginData* self) { return new HINTERNET(self->*member); }, Session());
+}
+
+// A link to a service page, built as a unicode object by the session.
+PyObject* GetLink(PyObject* args, const char* function, LinkGetter getter) {
+  return Call(args, function, PassedThrough{}, [getter](OBLoginData* self) { return (self->*getter)(); },
+              Session());
 }
 
 }  // namespace
@@ -88,9 +95,52 @@ PyObject* OBLoginData_GetLoginTokenID(PyObject*, PyObject* args) {
               [](OBLoginData* self) { return self->GetLoginTokenID(); }, Session());
 }
 
+PyObject* OBLoginData_GetSignUpURL(PyObject*, PyObject* args) {
+  return GetLink(args, "OBLoginData_GetSignUpURL", &OBLoginData::GetSignUpURL);
+}
+
+PyObject* OBLoginData_GetForgetPasswordURL(PyObject*, PyObject* args) {
+  return GetLink(args, "OBLoginData_GetForgetPasswordURL", &OBLoginData::GetForgetPasswordURL);
+}
+
+PyObject* OBLoginData_GetLensCorrectionURL(PyObject*, PyObject* args) {
+  return GetLink(args, "OBLoginData_GetLensCorrectionURL", &OBLoginData::GetLensCorrectionURL);
+}
+
+PyObject* OBLoginData_GetPresetCategory(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_GetPresetCategory", PassedThrough{},
+              [](OBLoginData* self, const wchar_t* language) { return self->GetPresetCategory(language); },
+              Session(), Unicode());
+}
+
+// The name is written into the string object passed in, which must exist.
+PyObject* OBLoginData_GetCategroyName(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_GetCategroyName", ReturnsInt{},
+              [](OBLoginData* self, int id, CString& name) { return self->GetCategroyName(id, name); },
+              Session(), Integer("int"), Reference<CString>(Type(TypeId::CString), "CString &"));
+}
+
 PyObject* OBLoginData_GetCategoryCount(PyObject*, PyObject* args) {
   return Call(args, "OBLoginData_GetCategoryCount", ReturnsInt{},
               [](OBLoginData* self) { return self->GetCategoryCount(); }, Session());
+}
+
+PyObject* OBLoginData_SetRelateVideo(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_SetRelateVideo", PassedThrough{},
+              [](OBLoginData* self, const wchar_t* videoURL, const wchar_t* website, const wchar_t* videoInfo) {
+                return self->SetRelateVideo(videoURL, website, videoInfo);
+              },
+              Session(), Unicode(), Unicode(), Unicode());
+}
+
+PyObject* OBLoginData_GetPresetDownloadURL(PyObject*, PyObject* args) {
+  return GetLink(args, "OBLoginData_GetPresetDownloadURL", &OBLoginData::GetPresetDownloadURL);
+}
+
+PyObject* OBLoginData_GetEffectByGUID(PyObject*, PyObject* args) {
+  return Call(args, "OBLoginData_GetEffectByGUID", PassedThrough{},
+              [](OBLoginData* self, const wchar_t* guid) { return self->GetEffectByGUID(guid); }, Session(),
+              Unicode());
 }
 
 PyObject* OBLoginData_m_hInternet_set(PyObject*, PyObject* args) {

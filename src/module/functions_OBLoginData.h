@@ -1,5 +1,6 @@
-// Module functions of the OBLoginData session: construction, the plain accessors
-// sign-in, discovery and the probe members (Nos. 10 to 18, 24, 28 to 38).
+// Module functions of the OBLoginData session: construction, the plain accessors,
+// sign-in, discovery, categories, related video, effect lookup, service links and
+// the probe members (Nos. 10 to 38).
 #pragma once
 
 #include <Python.h>
@@ -15,7 +16,15 @@ PyObject* OBLoginData_SetOBURLAsReg(PyObject* self, PyObject* args);
 PyObject* OBLoginData_GetUserName(PyObject* self, PyObject* args);
 PyObject* OBLoginData_GetServerUrl(PyObject* self, PyObject* args);
 PyObject* OBLoginData_GetLoginTokenID(PyObject* self, PyObject* args);
+PyObject* OBLoginData_GetSignUpURL(PyObject* self, PyObject* args);
+PyObject* OBLoginData_GetForgetPasswordURL(PyObject* self, PyObject* args);
+PyObject* OBLoginData_GetLensCorrectionURL(PyObject* self, PyObject* args);
+PyObject* OBLoginData_GetPresetCategory(PyObject* self, PyObject* args);
+PyObject* OBLoginData_GetCategroyName(PyObject* self, PyObject* args);
 PyObject* OBLoginData_GetCategoryCount(PyObject* self, PyObject* args);
+PyObject* OBLoginData_SetRelateVideo(PyObject* self, PyObject* args);
+PyObject* OBLoginData_GetPresetDownloadURL(PyObject* self, PyObject* args);
+PyObject* OBLoginData_GetEffectByGUID(PyObject* self, PyObject* args);
 PyObject* OBLoginData_m_hInternet_set(PyObject* self, PyObject* args);
 PyObject* OBLoginData_m_hInternet_get(PyObject* self, PyObject* args);
 PyObject* OBLoginData_m_hConnect_set(PyObject* self, PyObject* args);

@@ -58,6 +58,18 @@ class OBLoginData {
   // The reachability probe (reachability.cc): nonzero when the URL could be opened.
   BOOL CheckServerReachable(const char* url);
 
+  // Preset categories (categories.cc).
+  PyObject* GetPresetCategory(const wchar_t* language);
+  int GetCategroyName(int id, std::wstring& name) const;
+  // Related video (related_video.cc).
+  PyObject* SetRelateVideo(const wchar_t* videoURL, const wchar_t* website, const wchar_t* videoInfo);
+  // Effect lookup (effect_lookup.cc) and the links to the service's pages (links.cc).
+  PyObject* GetEffectByGUID(const wchar_t* guid);
+  PyObject* GetPresetDownloadURL();
+  PyObject* GetSignUpURL();
+  PyObject* GetForgetPasswordURL();
+  PyObject* GetLensCorrectionURL();
+
   // The reachability probe's state, also read and written from Python.
   HINTERNET m_hInternet;
   HINTERNET m_hConnect;
@@ -75,6 +87,8 @@ class OBLoginData {
   // Stores what a sign-in reply carries but the token; returns 1 with the token.
   unsigned int ReadSignInReply(const xml::Document& reply, std::wstring& token,
                                bool& firstLogin);
+  void GetVideoID(std::wstring& videoID);
+  PyObject* ServiceLink(std::wstring OBLoginData::*storedLink);
 
   BOOL m_bLoggedIn;
   std::wstring m_strServerUrl;  // bare host name of every service request

@@ -1,0 +1,71 @@
+// Preset categories: the request in the user's language, the walk of the reply
+// into the session's map, and the whole map handed to Python as a dictionary.
+#include <Python.h>
+
+#include <string>
+
+#include "platform/text.h"
+#include "platform/xml.h"
+#include "service/OBLoginData.h"
+#include "service/UnicodeResult.h"
+#include "service/reply_walk.h"
+#include "service/server_request.h"
+
+namespace {
+
+constexpr wchar_t kCategoryServlet[] = L"/servlet/getPresetCategory";
+constexpr wchar_t kCategoriesElement[] = L"categories";
+constexpr wchar_t kCategoryElement[] = L"category";
+constexpr char kCategoryIdAttribute[] = "categoryid";
+
+// Adds the reply's categories to the map, replacing the names of known ids.
+void AddCategories(const xml::Document& reply, std::map<std::wstring, std::wstring>& categories) {
+  for (const xml::Node& list : ChildrenNamed(reply.Top(), kCategoriesElement)) {
+    for (const xml::Node& category : ChildrenNamed(list, kCategoryElement)) {
+      const std::wstring id = category.Attribute(kCategoryIdAttribute);
+      if (!id.empty()) categories[id] = category.Text();
+    }
+  }
+}
+
+// A failure to build the dictionary's items ends the filling; the entries made so
+// far are returned, as the caller asked for what is known, not for an exception.
+void FillDictionary(PyObject* dictionary, const std::map<std::wstring, std::wstring>& categories) {
+  for (const auto& [id, name] : categories) {
+    PyObject* key = NewUnicodeResult(id);
+    PyObject* value = NewUnicodeResult(name);
+    const bool stored = key && value && PyDict_SetItem(dictionary, key, value) == 0;
+    Py_XDECREF(key);
+    Py_XDECREF(value);
+    if (!stored) {
+      PyErr_Clear();
+      return;
+    }
+  }
+}
+
+}  // namespace
+
+PyObject* OBLoginData::GetPresetCategory(const wchar_t* language) {
+  PyObject* dictionary = PyDict_New();
+  if (!dictionary) {
+    PyErr_Clear();
+    Py_RETURN_NONE;
+  }
+  EnsureServerUrl();
+  const std::wstring path =
+      QueryPath(kCategoryServlet, {{L"Locid", text::WideView(language)}, {L"Version", m_strVersion}});
+  // A failed exchange adds nothing: the categories of earlier calls are returned.
+  if (const auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
+    AddCategories(xml::Document(*reply), m_mapCategory);
+  }
+  FillDictionary(dictionary, m_mapCategory);
+  return dictionary;
+}
+
+int OBLoginData::GetCategroyName(int id, std::wstring& name) const {
+  const auto found = m_mapCategory.find(std::to_wstring(id));
+  if (found == m_mapCategory.end()) return 0;
+  name = found->second;
+  return 1;
+}

@@ -1,0 +1,41 @@
+// Effect lookup: where the picture-in-picture effect with a GUID is downloaded.
+#include <Python.h>
+
+#include <string>
+
+#include "platform/xml.h"
+#include "service/OBLoginData.h"
+#include "service/UnicodeResult.h"
+#include "service/reply_walk.h"
+#include "service/server_request.h"
+#include "service/unescape_url.h"
+
+namespace {
+
+constexpr wchar_t kEffectServlet[] = L"/servlet/GetEffectByGUIDForQZM";
+constexpr wchar_t kPipElement[] = L"PIP";
+constexpr wchar_t kPipUrlElement[] = L"pipURL";
+
+// The last "pipURL" under the last "PIP" that holds one; empty when there is none.
+std::wstring EffectAddress(const xml::Document& reply) {
+  std::wstring address;
+  for (const xml::Node& pip : ChildrenNamed(reply.Top(), kPipElement)) {
+    for (const xml::Node& link : ChildrenNamed(pip, kPipUrlElement)) address = link.Text();
+  }
+  return address;
+}
+
+}  // namespace
+
+PyObject* OBLoginData::GetEffectByGUID(const wchar_t* guid) {
+  if (!guid) Py_RETURN_NONE;
+  // Signed out, the token is empty and sent as such.
+  const std::wstring token = GetToken();
+  EnsureServerUrl();
+  const std::wstring path = QueryPath(kEffectServlet, {{L"token", token}, {L"guid", guid}});
+  std::wstring address;
+  if (const auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
+    address = EffectAddress(xml::Document(*reply));
+  }
+  return NewUnicodeResult(UnescapeUrl(address));
+}
