@@ -9,6 +9,7 @@ images on the spot, and uploads them. Ctrl-C cancels the upload.
 import argparse
 import os
 import shutil
+import signal
 import struct
 import sys
 import tempfile
@@ -94,16 +95,22 @@ def choose_category(session):
 
 
 def wait_for(report, uploader):
-    """Runs Python on the main thread until the completion report has arrived."""
-    cancelled = False
-    while not report.done:
-        try:
+    """Runs Python on the main thread until the completion report has arrived.
+
+    Ctrl-C only notes the wish to cancel: an interrupt raised anywhere else, in
+    the middle of a report for instance, could lose the completion."""
+    interrupts = []
+    previous = signal.signal(signal.SIGINT, lambda number, frame: interrupts.append(number))
+    try:
+        cancelled = False
+        while not report.done:
             time.sleep(0.05)  # reports are delivered between Python instructions
-        except KeyboardInterrupt:
-            if not cancelled:
+            if interrupts and not cancelled:
                 cancelled = True
                 sys.stdout.write("\nCancelling...\n")
                 uploader.CancelUpload()
+    finally:
+        signal.signal(signal.SIGINT, previous)
 
 
 def main():
