@@ -3,7 +3,9 @@
 // address of the video's page.
 #include <Python.h>
 
+#include <optional>
 #include <string>
+#include <utility>
 
 #include "diag/trace.h"
 #include "platform/xml.h"
