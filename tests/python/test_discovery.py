@@ -1,6 +1,7 @@
 """Server discovery against the reference service: the detection request, the
 six fields of the service information, the staging fallback, the reachability
 probe in front of it, and the interpreter lock released while it all runs."""
+import os
 import time
 import unittest
 
@@ -131,10 +132,6 @@ class DetectionOnce(DiscoveryTest):
         self.assertEqual(self.discover(), unicode(SERVER_HOST))
         self.assertEqual(len(self.detections()), 1)
 
-    def test_a_host_argument_must_be_unicode(self):
-        with self.assertRaises(TypeError) as caught:
-            self.call('SetOBURLAsReg', 'my.server.test')
-        self.assertEqual(str(caught.exception), 'Unicode string expected')
 
 
 class Reachability(DiscoveryTest):
@@ -151,6 +148,14 @@ class Reachability(DiscoveryTest):
         self.assertEqual(self.discover(), unicode(STAGING_HOST))
         self.assertEqual(self.trace_lines(), FALLBACK_LINES)
         self.assertEqual(native.OBLoginData_m_bServerReachable_get(self.session), 0)
+        self.assertEqual(self.svc.requests(), [])
+
+    def test_a_probe_url_too_long_for_its_buffer_is_refused_unprobed(self):
+        os.environ['PYUPLOADER_DETECTION_HOST'] = 'd' * 253  # with "http://", 260 bytes
+        native.delete_OBLoginData(self.session)
+        self.session = self.new_session()
+        self.assertEqual(self.discover(), unicode(STAGING_HOST))
+        self.assertEqual(native.OBLoginData_m_szChkServerUrl_get(self.session), '')
         self.assertEqual(self.svc.requests(), [])
 
     def test_a_silent_host_is_given_up_after_the_last_wait(self):
