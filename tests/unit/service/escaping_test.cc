@@ -27,34 +27,29 @@ constexpr Escape kPath = &service::EscapePathValue;
 constexpr Escape kForm = &EscapeFormValue;
 
 INSTANTIATE_TEST_SUITE_P(
-    QueryValues, Escapes,
+    Cases, Escapes,
     ::testing::Values(
-        EscapeCase{"Plain", kPath, L"5.0", L"5.0"},
-        EscapeCase{"Empty", kPath, L"", L""},
-        EscapeCase{"Space", kPath, L"Home Edition", L"Home%20Edition"},
-        EscapeCase{"LineBreaksCannotInjectAHeader", kPath, L"a\r\nX-Evil: 1",
+        EscapeCase{"QueryPlain", kPath, L"5.0", L"5.0"},
+        EscapeCase{"QueryEmpty", kPath, L"", L""},
+        EscapeCase{"QuerySpace", kPath, L"Home Edition", L"Home%20Edition"},
+        EscapeCase{"QueryLineBreaksCannotInjectAHeader", kPath, L"a\r\nX-Evil: 1",
                    L"a%0D%0AX-Evil:%201"},
-        EscapeCase{"TabAndDelete", kPath, L"\t\x7F", L"%09%7F"},
-        EscapeCase{"NonAsciiAsUtf8Bytes", kPath, L"\u00E4\u20AC", L"%C3%A4%E2%82%AC"},
-        EscapeCase{"OutsideTheBasicPlane", kPath, L"\U0001F600", L"%F0%9F%98%80"},
-        EscapeCase{"FragmentMarkWouldEndTheTarget", kPath, L"a#b", L"a%23b"},
-        EscapeCase{"SeparatorsStayAsSentToday", kPath, L"a&b=c", L"a&b=c"},
-        EscapeCase{"PercentAndOtherPrintablesStay", kPath, L"%41\"<>[]{}|\\^`?/:@!$'()*+,;~",
-                   L"%41\"<>[]{}|\\^`?/:@!$'()*+,;~"}),
-    [](const auto& info) { return info.param.name; });
-
-INSTANTIATE_TEST_SUITE_P(
-    FormValues, Escapes,
-    ::testing::Values(
-        EscapeCase{"Empty", kForm, L"", L""},
-        EscapeCase{"Space", kForm, L"Ann Lee", L"Ann%20Lee"},
-        EscapeCase{"FieldSeparatorsKeepSixFields", kForm, L"a&pwd=b", L"a%26pwd%3db"},
-        EscapeCase{"PercentIsEscapedToo", kForm, L"%41%", L"%2541%25"},
-        EscapeCase{"NonAsciiAsLowerCaseUtf8", kForm, L"\u00E4", L"%c3%a4"},
-        EscapeCase{"ControlsAndDelete", kForm, L"\n\x01\x7F", L"%0a%01%7f"},
-        EscapeCase{"EveryUnsafePrintable", kForm, L" \"#$&+,;<=>?@[\\]^`{|}",
+        EscapeCase{"QueryTabAndDelete", kPath, L"\t\x7F", L"%09%7F"},
+        EscapeCase{"QueryNonAsciiAsUtf8Bytes", kPath, L"\u00E4\u20AC", L"%C3%A4%E2%82%AC"},
+        EscapeCase{"QueryOutsideTheBasicPlane", kPath, L"\U0001F600", L"%F0%9F%98%80"},
+        EscapeCase{"QueryFragmentMarkWouldEndTheTarget", kPath, L"a#b", L"a%23b"},
+        EscapeCase{"QuerySeparatorsStayAsSentToday", kPath, L"a&b=c", L"a&b=c"},
+        EscapeCase{"QueryPercentAndOtherPrintablesStay", kPath, L"%41\"<>[]{}|\\^`?/:@!$'()*+,;~",
+                   L"%41\"<>[]{}|\\^`?/:@!$'()*+,;~"},
+        EscapeCase{"FormEmpty", kForm, L"", L""},
+        EscapeCase{"FormSpace", kForm, L"Ann Lee", L"Ann%20Lee"},
+        EscapeCase{"FormFieldSeparatorsKeepSixFields", kForm, L"a&pwd=b", L"a%26pwd%3db"},
+        EscapeCase{"FormPercentIsEscapedToo", kForm, L"%41%", L"%2541%25"},
+        EscapeCase{"FormNonAsciiAsLowerCaseUtf8", kForm, L"\u00E4", L"%c3%a4"},
+        EscapeCase{"FormControlsAndDelete", kForm, L"\n\x01\x7F", L"%0a%01%7f"},
+        EscapeCase{"FormEveryUnsafePrintable", kForm, L" \"#$&+,;<=>?@[\\]^`{|}",
                    L"%20%22%23%24%26%2b%2c%3b%3c%3d%3e%3f%40%5b%5c%5d%5e%60%7b%7c%7d"},
-        EscapeCase{"SafePrintablesStay", kForm, L"Az09!'()*-./:_~", L"Az09!'()*-./:_~"}),
+        EscapeCase{"FormSafePrintablesStay", kForm, L"Az09!'()*-./:_~", L"Az09!'()*-./:_~"}),
     [](const auto& info) { return info.param.name; });
 
 TEST(FormValueLength, ALongValueIsEscapedWhole) {
