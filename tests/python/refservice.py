@@ -45,17 +45,17 @@ POLL_INTERVAL = 0.05
 
 def reply(body=None, status=None, headers=None, **options):
     """A scripted reply. body is sent byte for byte (unicode as UTF-8)."""
-    spec = dict(options)
+    scripted = dict(options)
     if body is not None:
         if isinstance(body, unicode):
             body = body.encode('utf-8')
-        spec['body_b64'] = base64.b64encode(body)
-        spec.setdefault('status', 200)
+        scripted['body_b64'] = base64.b64encode(body)
+        scripted.setdefault('status', 200)
     if status is not None:
-        spec['status'] = status
+        scripted['status'] = status
     if headers is not None:
-        spec['headers'] = headers
-    return spec
+        scripted['headers'] = headers
+    return scripted
 
 
 def xml_reply(xml, status=200, **options):

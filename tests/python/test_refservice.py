@@ -193,9 +193,9 @@ class ScriptedRepliesTest(ServiceTestCase):
             ({'raw_b64': base64.b64encode('HTTP/1.0 999 Odd\r\n\r\nx')},
              'HTTP/1.0 999 Odd\r\n\r\nx'),
         ]
-        for spec, wire in cases:
-            self.svc.script(SERVER_HOST, self.path, [spec])
-            self.assertEqual(exchange(SERVER_HOST, request('POST', self.path)), wire, spec)
+        for scripted, wire in cases:
+            self.svc.script(SERVER_HOST, self.path, [scripted])
+            self.assertEqual(exchange(SERVER_HOST, request('POST', self.path)), wire, scripted)
 
     def test_delivery_options_without_a_body_keep_the_default_answer(self):
         self.svc.script(DETECTION_HOST, '/observer.jsp', [reply(chunked=True, pieces=3)])
@@ -204,8 +204,8 @@ class ScriptedRepliesTest(ServiceTestCase):
         self.assertEqual(element(body, 'APIUrl'), SERVER_HOST)
 
     def test_a_delayed_or_paced_reply_takes_at_least_its_pauses(self):
-        for spec in (reply('x', delay=0.4), reply('abcd', pieces=[1, 1], pause=0.2)):
-            self.svc.script(SERVER_HOST, self.path, [spec])
+        for scripted in (reply('x', delay=0.4), reply('abcd', pieces=[1, 1], pause=0.2)):
+            self.svc.script(SERVER_HOST, self.path, [scripted])
             start = time.time()
             call('POST', self.path)
             self.assertGreaterEqual(time.time() - start, 0.38)
