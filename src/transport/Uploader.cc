@@ -34,6 +34,13 @@ win::Status ReadNext(file::File& source, std::vector<char>& buffer, std::uint32_
   return source.Read(buffer.data(), wanted, count);
 }
 
+// The old buffer goes before the new one is made, so the two are never held
+// at once (8 and 16 MiB at the top).
+void Reallocate(std::vector<char>& buffer, std::size_t size) {
+  std::vector<char>().swap(buffer);
+  buffer.resize(size);
+}
+
 // Keeps each write between half a second and 1.25 s.
 std::uint32_t NextChunkSize(std::uint32_t chunk, std::uint32_t writeMs) {
   if (writeMs < Uploader::kFastWriteMs) {
@@ -181,11 +188,13 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
     }
     if (sent == size) return FileChanged();
     const std::uint32_t writeStart = environment_.tickCount();
+    const ChunkLog::Stamp logStart = chunkLog_.Begin();
     status = connection.Write(std::string_view(buffer.data(), count));
     const std::uint32_t writeMs = environment_.tickCount() - writeStart;
+    chunkLog_.Note(count, logStart);
     if (win::Failed(status)) return status;
     chunk = NextChunkSize(chunk, writeMs);
-    if (chunk != buffer.size()) buffer = std::vector<char>(chunk);
+    if (chunk != buffer.size()) Reallocate(buffer, chunk);
     sent += static_cast<std::uint32_t>(count);
     totals.sent += static_cast<std::uint32_t>(count);
     environment_.sleep(kPauseAfterChunkMs);

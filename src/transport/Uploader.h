@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "platform/win_error.h"
+#include "transport/ChunkLog.h"
 #include "transport/UploadEnvironment.h"
 #include "transport/UploadFile.h"
 
@@ -76,4 +77,5 @@ class Uploader {
   std::uint32_t CurrentTick() const;
 
   UploadEnvironment environment_;
+  ChunkLog chunkLog_;
 };
