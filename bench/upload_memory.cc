@@ -27,8 +27,9 @@
 namespace {
 
 constexpr long kMiB = 1024 * 1024;
-// The largest chunk, plus libcurl's buffers and the allocator's slack.
-constexpr long kAllowedGrowthKiB = 48 * 1024;
+// The largest chunk (16 MiB), plus this program's own server, libcurl's buffers
+// and the allocator's slack.
+constexpr long kAllowedGrowthKiB = 24 * 1024;
 
 // Reads one request to the end of its announced body and answers 200.
 class DiscardServer {

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <limits>
+#include <new>
 
 #include "platform/file.h"
 #include "transport/UploadProgress.h"
@@ -26,19 +27,12 @@ bool FitsTheWire(std::uint64_t length, const std::vector<std::uint64_t>& fileSiz
 // The file no longer holds the bytes the announced length counted.
 win::Status FileChanged() { return win::StatusFromWin32(win::kErrorFileInvalid); }
 
-// Reads the next piece of at most `left` bytes; with nothing left, one byte
+// Reads the next piece: a chunk, or the `left` bytes if fewer; with nothing left, one byte
 // more shows whether the file has grown.
-win::Status ReadNext(file::File& source, std::vector<char>& buffer, std::uint32_t left,
+win::Status ReadNext(file::File& source, char* buffer, std::uint32_t chunk, std::uint32_t left,
                      std::size_t* count) {
-  const std::size_t wanted = left == 0 ? 1 : std::min<std::size_t>(buffer.size(), left);
-  return source.Read(buffer.data(), wanted, count);
-}
-
-// The old buffer goes before the new one is made, so the two are never held
-// at once (8 and 16 MiB at the top).
-void Reallocate(std::vector<char>& buffer, std::size_t size) {
-  std::vector<char>().swap(buffer);
-  buffer.resize(size);
+  const std::size_t wanted = left == 0 ? 1 : std::min(chunk, left);
+  return source.Read(buffer, wanted, count);
 }
 
 // Keeps each write between half a second and 1.25 s.
@@ -169,7 +163,8 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
   const std::uint32_t startTick = CurrentTick();
   std::uint32_t lastTick = startTick;
   std::uint32_t chunk = kChunkFloor;
-  std::vector<char> buffer(chunk);
+  char* buffer = ChunkBuffer();
+  if (buffer == nullptr) return win::StatusFromWin32(win::kErrorNotEnoughMemory);
   auto report = [&](std::uint32_t fileSent) {
     listener->OnFileProgress(name, fileSent, size, estimate.fileLeft, totals.sent, totals.size,
                              estimate.allLeft, estimate.speed);
@@ -178,7 +173,7 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
   if (listener->IsCancelled()) return UPLOAD_E_CANCELLED;
   for (;;) {
     std::size_t count = 0;
-    win::Status status = ReadNext(source, buffer, size - sent, &count);
+    win::Status status = ReadNext(source, buffer, chunk, size - sent, &count);
     if (win::Failed(status)) return status;
     if (count == 0) {
       if (sent != size) return FileChanged();
@@ -189,12 +184,11 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
     if (sent == size) return FileChanged();
     const std::uint32_t writeStart = environment_.tickCount();
     const ChunkLog::Stamp logStart = chunkLog_.Begin();
-    status = connection.Write(std::string_view(buffer.data(), count));
+    status = connection.Write(std::string_view(buffer, count));
     const std::uint32_t writeMs = environment_.tickCount() - writeStart;
     chunkLog_.Note(count, logStart);
     if (win::Failed(status)) return status;
     chunk = NextChunkSize(chunk, writeMs);
-    if (chunk != buffer.size()) Reallocate(buffer, chunk);
     sent += static_cast<std::uint32_t>(count);
     totals.sent += static_cast<std::uint32_t>(count);
     environment_.sleep(kPauseAfterChunkMs);
@@ -212,6 +206,15 @@ void Uploader::ReadReply(UploadConnection& connection) {
   std::uint32_t code = 0;
   if (connection.QueryStatusCode(&code)) result->httpStatus = code;
   reply = connection.ReadReply();
+}
+
+// Fresh memory costs a page fault per page when first touched. One block for
+// the whole upload, of which each read fills at most the current chunk size,
+// touches every page once rather than again at each change of the chunk size,
+// and never holds more than the largest chunk used.
+char* Uploader::ChunkBuffer() {
+  if (!chunkBuffer_) chunkBuffer_.reset(new (std::nothrow) char[kChunkCeiling]);
+  return chunkBuffer_.get();
 }
 
 std::uint32_t Uploader::CurrentTick() const { return environment_.tickCount() / kMsPerTick; }

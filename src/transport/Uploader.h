@@ -5,6 +5,7 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -74,8 +75,11 @@ class Uploader {
   win::Status StreamFile(UploadConnection& connection, const std::wstring& path,
                          file::File& source, std::uint32_t size, Totals& totals);
   void ReadReply(UploadConnection& connection);
+  // Null when it cannot be had.
+  char* ChunkBuffer();
   std::uint32_t CurrentTick() const;
 
   UploadEnvironment environment_;
   ChunkLog chunkLog_;
+  std::unique_ptr<char[]> chunkBuffer_;  // kChunkCeiling bytes, made at the first file
 };
