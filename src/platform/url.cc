@@ -20,6 +20,16 @@ bool GetPart(CURLU* handle, CURLUPart part, unsigned flags, std::string* out) {
   return code == CURLUE_NO_USER || code == CURLUE_NO_PASSWORD;
 }
 
+// The system's parser keeps percent-escapes in a host name as written; curl
+// decodes them, so "a%2541" would become "a%41" and, read again, "aA". Such a
+// host is refused rather than turned into another one. IPv6 literals keep
+// their escaped zone ("[fe80::1%25eth0]").
+bool HostHasEscape(std::string_view authority) {
+  const std::size_t at = authority.rfind('@');
+  const std::string_view host = at == std::string_view::npos ? authority : authority.substr(at + 1);
+  return !host.empty() && host.front() != '[' && host.find('%') != std::string_view::npos;
+}
+
 bool Fits(const std::string& component) { return component.size() < kComponentCapacity; }
 
 bool AllFit(const Components& c) {
@@ -37,6 +47,9 @@ bool Split(std::string_view text, Components* components) {
   if (colon == std::string_view::npos || text.substr(colon + 1, 2) != "//") return false;
   const std::size_t authority = colon + 3;
   if (authority >= text.size() || text[authority] == '/') return false;
+  if (HostHasEscape(text.substr(authority, text.find_first_of("/?#", authority) - authority))) {
+    return false;
+  }
   const curl::Url handle(curl_url());
   if (!handle) return false;
   const std::string whole(text);

@@ -16,12 +16,25 @@ constexpr unsigned kParseOptions = pugi::parse_default | pugi::parse_comments |
 
 std::wstring Wide(const char* utf8) { return text::Utf8ToWide(utf8); }
 
-void AppendText(pugi::xml_node node, std::string& out) {
-  if (node.type() == pugi::node_pcdata || node.type() == pugi::node_cdata) {
-    out += node.value();
-    return;
+bool IsText(pugi::xml_node node) {
+  return node.type() == pugi::node_pcdata || node.type() == pugi::node_cdata;
+}
+
+// Walks the subtree in document order without recursion: a reply may nest
+// elements deeper than the stack could follow.
+void AppendText(pugi::xml_node top, std::string& out) {
+  pugi::xml_node node = top;
+  for (;;) {
+    if (IsText(node)) {
+      out += node.value();
+    } else if (pugi::xml_node child = node.first_child()) {
+      node = child;
+      continue;
+    }
+    while (node != top && !node.next_sibling()) node = node.parent();
+    if (node == top) return;
+    node = node.next_sibling();
   }
-  for (pugi::xml_node child : node.children()) AppendText(child, out);
 }
 
 bool IsWellFormedDocument(const pugi::xml_document& document) {
