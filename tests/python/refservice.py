@@ -135,10 +135,6 @@ class RefService(object):
         query = self._query(host=host, path=path, since=since, bodies=None if bodies else '0')
         return [Request(r) for r in self._call('/requests' + query)['requests']]
 
-    def connections(self, host=None):
-        return [Recorded(c) for c in self._call('/connections' + self._query(host=host))
-                ['connections']]
-
     def wait_for_requests(self, count=1, host=None, path=None, timeout=10.0, ready=None):
         """Polls until count requests match (and ready(request) holds for
         each, if given); returns them. Raises AssertionError on time-out."""
