@@ -30,9 +30,6 @@ class SessionTest(unittest.TestCase):
 
 class NewSession(SessionTest):
 
-    def test_is_a_bare_pointer_object(self):
-        self.assertIn("<Swig Object of type 'OBLoginData *' at 0x", repr(self.session))
-
     def test_texts_are_empty_unicode_and_there_are_no_categories(self):
         for getter in (native.OBLoginData_GetUserName, native.OBLoginData_GetServerUrl,
                        native.OBLoginData_GetLoginTokenID):
@@ -61,18 +58,6 @@ class NewSession(SessionTest):
         self.assertEqual(out, "swig/python detected a memory leak of type 'HINTERNET *', "
                               "no destructor found.\n")
 
-    def test_a_registered_class_instance_stands_for_its_session(self):
-        class Session(object):
-            __swig_destroy__ = native.delete_OBLoginData
-
-            def __init__(self):
-                self.this = native.new_OBLoginData(u'5.0', u'', u'')
-        native.OBLoginData_swigregister(Session)
-        session = Session()
-        self.assertEqual(native.OBLoginData_GetUserName(session), u'')
-        native.OBLoginData_m_bServerReachable_set(session, 1)
-        self.assertEqual(native.OBLoginData_m_bServerReachable_get(session), 1)
-
 
 class ProbeMembers(SessionTest):
 
@@ -82,23 +67,13 @@ class ProbeMembers(SessionTest):
     def set_url(self, value):
         native.OBLoginData_m_szChkServerUrl_set(self.session, value)
 
-    def test_a_short_url_clears_the_rest_of_the_array(self):
-        self.set_url('x' * MAX_PATH)
-        self.set_url('a' * 100)
-        self.assertEqual(self.url(), 'a' * 100)
-
-    def test_a_full_array_needs_no_terminator(self):
-        self.set_url('b' * MAX_PATH)
-        self.assertEqual(self.url(), 'b' * MAX_PATH)
-
-    def test_the_getter_keeps_zero_bytes_before_the_last_other_byte(self):
-        self.set_url('a\0\0b\0\0')
-        self.assertEqual(self.url(), 'a\0\0b')
-
-    def test_none_clears_the_array(self):
-        self.set_url('abc')
-        self.set_url(None)
-        self.assertEqual(self.url(), '')
+    def test_the_url_reads_back_without_its_trailing_zeros(self):
+        cases = [('a' * 100, 'a' * 100), ('b' * MAX_PATH, 'b' * MAX_PATH),
+                 ('a\0\0b\0\0', 'a\0\0b'), (None, '')]
+        for value, read in cases:
+            self.set_url('x' * MAX_PATH)  # a shorter value clears what the longer one left
+            self.set_url(value)
+            self.assertEqual(self.url(), read, value)
 
     def test_too_long_or_unicode_urls_are_refused_and_change_nothing(self):
         self.set_url('keep')
@@ -110,10 +85,11 @@ class ProbeMembers(SessionTest):
         self.assertEqual(self.url(), 'keep')
 
     def test_reachable_flag_takes_32_bit_integers(self):
-        for value, stored in ((True, 1), (0, 0), (-5, -5), (2 ** 31 - 1, 2 ** 31 - 1), (7L, 7)):
+        for value, stored in ((True, 1), (0, 0), (-2 ** 31, -2 ** 31), (2 ** 31 - 1, 2 ** 31 - 1),
+                              (7L, 7)):
             native.OBLoginData_m_bServerReachable_set(self.session, value)
             self.assertEqual(native.OBLoginData_m_bServerReachable_get(self.session), stored)
-        for value in (2 ** 31, -2 ** 31 - 1, 1.0, '1', None):
+        for value in (2 ** 31, -2 ** 31 - 1, 2L ** 31, 2L ** 80, 1.0, '1', None):
             with self.assertRaises(TypeError) as caught:
                 native.OBLoginData_m_bServerReachable_set(self.session, value)
             self.assertEqual(str(caught.exception), "in method 'OBLoginData_m_bServerReachable_set', "

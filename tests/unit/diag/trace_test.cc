@@ -3,7 +3,6 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
-#include <optional>
 #include <string>
 
 #include "support/trace_capture.h"
@@ -33,25 +32,6 @@ TEST(TraceAtLoad, IsOffUntilAComponentReadsTheSwitch) {
   EXPECT_FRESH_PROCESS_WRITES((TraceSetPrefix("Unit"), TraceMessage(L"late")), "[Unit]late\n");
 }
 
-struct SwitchCase {
-  std::optional<std::uint32_t> dumpMsg;  // empty: the value is missing
-  bool writes;
-};
-
-class TraceSwitch : public ::testing::TestWithParam<SwitchCase> {};
-
-TEST_P(TraceSwitch, IsReadWhenAComponentSetsThePrefix) {
-  TraceCapture capture(GetParam().dumpMsg);
-  TraceSetPrefix("Unit");
-  TraceMessage(L"hello %d", 5);
-  EXPECT_EQ(capture.Bytes(), GetParam().writes ? "[Unit]hello 5\n" : "");
-}
-
-INSTANTIATE_TEST_SUITE_P(Values, TraceSwitch,
-                         ::testing::Values(SwitchCase{std::nullopt, false}, SwitchCase{0u, false},
-                                           SwitchCase{1u, true}, SwitchCase{0xFFFFFFFFu, true},
-                                           SwitchCase{2u, true}));
-
 TEST(TraceSwitchState, KeyThatCannotBeOpenedKeepsThePreviousStateAndPrefix) {
   TraceCapture capture(1);
   TraceSetPrefix("First");
@@ -64,17 +44,6 @@ TEST(TraceSwitchState, KeyThatCannotBeOpenedKeepsThePreviousStateAndPrefix) {
   TraceSetPrefix("Fourth");
   TraceMessage(L"still off");
   EXPECT_EQ(capture.Bytes(), "[First]still on\n");
-}
-
-TEST(TraceSwitchState, MissingHiveFileKeepsThePreviousState) {
-  TraceCapture capture(1);
-  TraceSetPrefix("Unit");
-  {
-    test_support::ScopedEnv noHive(registry::kHivePathVariable, "/nonexistent/hive.reg");
-    TraceSetPrefix("Other");
-  }
-  TraceMessage(L"on");
-  EXPECT_EQ(capture.Bytes(), "[Unit]on\n");
 }
 
 struct PrefixCase {
@@ -110,26 +79,11 @@ TEST(TracePrefixScope, BelongsToTheProcessNotToTheComponent) {
   EXPECT_EQ(capture.Bytes(), "[OBLoginData]one\n[PyPresetUploader]two\n");
 }
 
-TEST(TraceLine, LongTextIsCutAtItsLimit) {
-  TraceCapture capture(1);
-  TraceSetPrefix("Unit");
-  TraceMessage(L"%s", std::wstring(1500, L'a').c_str());
-  EXPECT_EQ(capture.Bytes(), "[Unit]" + std::string(kTraceTextLimit, 'a') + "\n");
-}
-
 TEST(TraceLine, WideAndNarrowArgumentsFollowTheWindowsConvention) {
   TraceCapture capture(1);
   TraceSetPrefix("Unit");
   TraceMessage(L"KRV version = %s; host %S; %d%%", L"5.0 \u00E4", "n\xC3\xA4", 7);
   EXPECT_EQ(capture.Text(), L"[Unit]KRV version = 5.0 \u00E4; host n\u00E4; 7%\n");
-}
-
-TEST(TraceLine, NothingIsWrittenWhileTheSwitchIsOff) {
-  TraceCapture capture(0);
-  TraceSetPrefix("Unit");
-  TraceMessage(L"%s", L"secret");
-  TraceMessage(L"plain");
-  EXPECT_EQ(capture.Bytes(), "");
 }
 
 }  // namespace

@@ -25,36 +25,10 @@ std::wstring UnicodeText(PyObject* object) {
   return std::wstring(reinterpret_cast<const wchar_t*>(PyUnicode_AS_UNICODE(object)), PyUnicode_GET_SIZE(object));
 }
 
-TEST(NewSession, StartsEmptyWithItsProbeStateCleared) {
-  OBLoginData session(L"5.0", L"Retail", L"machine-1");
-  EXPECT_EQ(UnicodeText(session.GetUserName()), L"");
-  EXPECT_EQ(UnicodeText(session.GetServerUrl()), L"");
-  EXPECT_EQ(UnicodeText(session.GetLoginTokenID()), L"");
-  EXPECT_EQ(session.GetCategoryCount(), 0);
-  EXPECT_EQ(session.m_hInternet, nullptr);
-  EXPECT_EQ(session.m_hConnect, nullptr);
-  EXPECT_EQ(session.m_hRequest, nullptr);
-  EXPECT_EQ(session.m_bServerReachable, 0);
-  EXPECT_EQ(std::string(session.m_szChkServerUrl, kMaxPath), std::string(kMaxPath, '\0'));
-}
-
 TEST(NewSession, NullArgumentsAreEmptyTexts) {
   TraceCapture capture(1);
   OBLoginData session(nullptr, nullptr, nullptr);
   EXPECT_EQ(capture.Bytes(), "[OBLoginData]KRV version = \n[OBLoginData]KRV versionType = \n");
-}
-
-TEST(NewSession, WritesItsVersionTraceLinesWhenTheSwitchIsOn) {
-  TraceCapture capture(1);
-  OBLoginData session(L"5.0 \u00E4", L"Retail", L"machine-1");
-  EXPECT_EQ(capture.Text(), L"[OBLoginData]KRV version = 5.0 \u00E4\n[OBLoginData]KRV versionType = Retail\n");
-  capture.ExpectAbsent(L"machine-1");
-}
-
-TEST(NewSession, WritesNothingWhenTheSwitchIsOff) {
-  TraceCapture capture(0);
-  OBLoginData session(L"5.0", L"Retail", L"machine-1");
-  EXPECT_EQ(capture.Bytes(), "");
 }
 
 TEST(SessionAccessors, ReturnTheMembersAsUnicodeWithEveryCharacter) {
@@ -87,32 +61,23 @@ TEST(SessionToken, AReaderRacingAWriterSeesTheOldOrTheNewTokenNeverAMixture) {
   EXPECT_EQ(torn, 0);
 }
 
-struct HostCase {
-  const char* variable;
-  std::optional<std::string> value;
-  std::wstring ServiceHosts::*member;
-  std::wstring expected;
-};
-
-class ServiceHostSettings : public ::testing::TestWithParam<HostCase> {};
-
-TEST_P(ServiceHostSettings, AreCompiledDefaultsUnlessTheEnvironmentNamesOthers) {
-  ScopedEnv env(GetParam().variable, GetParam().value);
-  EXPECT_EQ(ServiceHosts::FromEnvironment().*(GetParam().member), GetParam().expected);
+// Each host is a compiled default that a non-empty environment variable replaces.
+TEST(ServiceHostSettings, TheEnvironmentReplacesEachDefaultUnlessEmpty) {
+  struct Case {
+    const char* variable;
+    std::wstring ServiceHosts::*member;
+  };
+  for (const Case& c : {Case{ServiceHosts::kDefaultHostVariable, &ServiceHosts::defaultHost},
+                        Case{ServiceHosts::kStagingHostVariable, &ServiceHosts::stagingHost},
+                        Case{ServiceHosts::kDetectionHostVariable, &ServiceHosts::detectionHost}}) {
+    std::optional<ScopedEnv> env(std::in_place, c.variable, std::nullopt);
+    const std::wstring compiled = ServiceHosts::FromEnvironment().*c.member;
+    EXPECT_FALSE(compiled.empty()) << c.variable;
+    env.emplace(c.variable, "");
+    EXPECT_EQ(ServiceHosts::FromEnvironment().*c.member, compiled) << c.variable;
+    env.emplace(c.variable, "host.test");
+    EXPECT_EQ(ServiceHosts::FromEnvironment().*c.member, L"host.test") << c.variable;
+  }
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    Hosts, ServiceHostSettings,
-    ::testing::Values(
-        HostCase{ServiceHosts::kDefaultHostVariable, std::nullopt, &ServiceHosts::defaultHost, L"www.orbishare.com"},
-        HostCase{ServiceHosts::kDefaultHostVariable, "", &ServiceHosts::defaultHost, L"www.orbishare.com"},
-        HostCase{ServiceHosts::kDefaultHostVariable, "local.test", &ServiceHosts::defaultHost, L"local.test"},
-        HostCase{ServiceHosts::kStagingHostVariable, std::nullopt, &ServiceHosts::stagingHost,
-                 L"staging.orbishare.com"},
-        HostCase{ServiceHosts::kStagingHostVariable, "stage.test", &ServiceHosts::stagingHost, L"stage.test"},
-        HostCase{ServiceHosts::kDetectionHostVariable, std::nullopt, &ServiceHosts::detectionHost,
-                 L"detect.orbishare.com"},
-        HostCase{ServiceHosts::kDetectionHostVariable, "detect.test", &ServiceHosts::detectionHost,
-                 L"detect.test"}));
 
 }  // namespace
