@@ -76,7 +76,8 @@ class RefusedArguments(WithRecord):
             self.assertRaisesText(TypeError, text, function, *args)
 
     def test_wide_string_accepts_unicode_str_and_none(self):
-        for given, expected in [(u'caf\xe9', u'caf\xe9'), ('plain', u'plain'), (None, u''),
+        for given, expected in [(u'caf\xe9 \U0001f600', u'caf\xe9 \U0001f600'),
+                                ('plain', u'plain'), (None, u''),
                                 (u'before\0after', u'before'), (u'', u'')]:
             made = peer.new_CString(given)
             self.assertEqual(peer.CString_value(made), expected)

@@ -62,17 +62,6 @@ PyObject* SetName(PyObject*, PyObject* args) {
               ThingArg(OnNull::kSkipCall), Reference<std::wstring>(Type(TestType::CString), "CString &"));
 }
 
-PyObject* AsUnsigned(PyObject*, PyObject* args) {
-  return Call(args, "as_unsigned", ReturnsUnsigned{},
-              [](int value) { return static_cast<uint32_t>(value); }, Integer("int"));
-}
-
-PyObject* AsStr(PyObject*, PyObject* args) {
-  return Call(args, "as_str", ReturnsStr{},
-              [](const std::array<char, 260>& bytes) { return std::string_view(bytes.data(), 260); },
-              NarrowArray<260>("char [_MAX_PATH]"));
-}
-
 PyObject* NewThing(PyObject*, PyObject* args) {
   return Call(args, "new_Thing", NewPointer(Type(TestType::Thing), POINTER_OWN | POINTER_NOSHADOW),
               [](const wchar_t* name) { return new Thing{name}; }, Unicode());
@@ -87,8 +76,6 @@ PyObject* RegisterThing(PyObject*, PyObject* args) { return Register(args, Type(
 PyMethodDef g_functions[] = {
     {"kinds", Kinds, METH_VARARGS, nullptr},
     {"set_name", SetName, METH_VARARGS, nullptr},
-    {"as_unsigned", AsUnsigned, METH_VARARGS, nullptr},
-    {"as_str", AsStr, METH_VARARGS, nullptr},
     {"new_Thing", NewThing, METH_VARARGS, nullptr},
     {"delete_Thing", DeleteThing, METH_VARARGS, nullptr},
     {"Thing_swigregister", RegisterThing, METH_VARARGS, nullptr},
@@ -160,17 +147,11 @@ INSTANTIATE_TEST_SUITE_P(
         Refusal{"calltest.kinds(None, *good[1:])",
                 "ValueError: invalid null reference in method 'kinds', argument 1 of type 'Thing *'"},
         Refusal{"calltest.kinds(thing, 'str', *good[2:])", "TypeError: Unicode string expected"},
-        Refusal{"calltest.kinds(thing, None, *good[2:])", "TypeError: Unicode string expected"},
         Refusal{"calltest.kinds(thing, u'', 5, *good[3:])", ARG(3, "wchar_t const *")},
-        Refusal{"calltest.kinds(thing, u'', thing, *good[3:])", ARG(3, "wchar_t const *")},
         Refusal{"calltest.kinds(*(good[:3] + (1.5,) + good[4:]))", ARG(4, "int")},
-        Refusal{"calltest.kinds(*(good[:3] + (2**31,) + good[4:]))", ARG(4, "int")},
         Refusal{"calltest.kinds(*(good[:4] + (2L**31,) + good[5:]))", ARG(5, "BOOL")},
-        Refusal{"calltest.kinds(*(good[:4] + (None,) + good[5:]))", ARG(5, "BOOL")},
         Refusal{"calltest.kinds(*(good[:5] + ('x' * 261,) + good[6:]))", ARG(6, "char [_MAX_PATH]")},
-        Refusal{"calltest.kinds(*(good[:5] + (u'x',) + good[6:]))", ARG(6, "char [_MAX_PATH]")},
         Refusal{"calltest.kinds(*good[:6])", "TypeError: kinds expected 7 arguments, got 6"},
-        Refusal{"calltest.kinds(*(good + (1,)))", "TypeError: kinds expected 7 arguments, got 8"},
         Refusal{"calltest.kinds(thing, u'', '\\xff', *good[3:])",
                 "UnicodeDecodeError: 'ascii' codec can't decode byte 0xff in position 0: "
                 "ordinal not in range(128)"},
@@ -208,20 +189,6 @@ TEST_F(CallSequence, ASetterWithANullObjectDoesNothing) {
   EXPECT_EQ(g_received.calls, 1);
   test_support::RunPython("assert calltest.kinds(*good) == 6");
   PyDict_DelItemString(globals, "name");
-}
-
-TEST_F(CallSequence, ResultKinds) {
-  test_support::RunPython(
-      "assert calltest.as_unsigned(-1) == 4294967295L and type(calltest.as_unsigned(-1)) is long\n"
-      "assert type(calltest.as_unsigned(5)) is int\n"
-      "assert calltest.as_str('') == ''\n"
-      "assert calltest.as_str('a\\0b') == 'a\\0b'\n"
-      "assert calltest.as_str('x' * 260) == 'x' * 260\n"
-      "made = calltest.new_Thing(u'n')\n"
-      "assert type(made).__name__ == 'PySwigObject' and made.own()\n"
-      "calltest.delete_Thing(made)\n"
-      "assert not made.own()\n"
-      "assert calltest.delete_Thing(None) is None\n");
 }
 
 }  // namespace

@@ -4,7 +4,6 @@
 #include <gtest/gtest.h>
 
 #include <array>
-#include <memory>
 #include <string>
 
 #include "module/runtime/PyRef.h"
@@ -24,37 +23,6 @@ PyRef Eval(const char* expression) {
   PyDict_SetItemString(globals.get(), "__builtins__", PyEval_GetBuiltins());
   return PyRef(PyRun_String(expression, Py_eval_input, globals.get(), globals.get()));
 }
-
-struct IntCase {
-  const char* expression;
-  int status;
-  int value;
-};
-
-class AsIntCases : public ::testing::TestWithParam<IntCase> {};
-
-TEST_P(AsIntCases, AcceptsSigned32BitIntegersOnly) {
-  PyRef object = Eval(GetParam().expression);
-  ASSERT_TRUE(object) << TakeError();
-  int value = 12345;
-  EXPECT_EQ(binding::AsInt(object.get(), &value), GetParam().status);
-  EXPECT_EQ(value, GetParam().value);
-  EXPECT_EQ(TakeError(), "");
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Values, AsIntCases,
-    ::testing::Values(IntCase{"True", binding::STATUS_OK, 1}, IntCase{"False", binding::STATUS_OK, 0},
-                      IntCase{"-2**31", binding::STATUS_OK, -2147483647 - 1},
-                      IntCase{"2**31 - 1", binding::STATUS_OK, 2147483647},
-                      IntCase{"7L", binding::STATUS_OK, 7},
-                      IntCase{"2**31", binding::STATUS_TYPE_ERROR, 12345},
-                      IntCase{"-2**31 - 1", binding::STATUS_TYPE_ERROR, 12345},
-                      IntCase{"2L**31", binding::STATUS_TYPE_ERROR, 12345},
-                      IntCase{"2L**80", binding::STATUS_TYPE_ERROR, 12345},
-                      IntCase{"1.5", binding::STATUS_TYPE_ERROR, 12345},
-                      IntCase{"'1'", binding::STATUS_TYPE_ERROR, 12345},
-                      IntCase{"None", binding::STATUS_TYPE_ERROR, 12345}));
 
 struct ArrayCase {
   const char* expression;
@@ -95,37 +63,6 @@ TEST(AsNarrowArray, TakesTheStringBehindACharPointer) {
   ASSERT_EQ(binding::AsNarrowArray(pointer.get(), buffer.data(), buffer.size()), binding::STATUS_OK);
   EXPECT_STREQ(buffer.data(), "pointed");
 }
-
-struct WideCase {
-  const char* expression;
-  const wchar_t* text;
-  int mark;
-};
-
-class AsWideStringCases : public ::testing::TestWithParam<WideCase> {};
-
-TEST_P(AsWideStringCases, CopiesTextObjects) {
-  PyRef object = Eval(GetParam().expression);
-  ASSERT_TRUE(object) << TakeError();
-  wchar_t* address = nullptr;
-  int mark = -1;
-  ASSERT_EQ(binding::AsWideString(object.get(), &address, nullptr, &mark), binding::STATUS_OK);
-  std::unique_ptr<wchar_t[]> copy(mark == binding::NEWOBJ ? address : nullptr);
-  EXPECT_EQ(mark, GetParam().mark);
-  if (GetParam().text) {
-    EXPECT_STREQ(address, GetParam().text);
-  } else {
-    EXPECT_EQ(address, nullptr);
-  }
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Kinds, AsWideStringCases,
-    ::testing::Values(WideCase{"u''", L"", binding::NEWOBJ},
-                      WideCase{"u'caf\\xe9 \\U0001f600'", L"caf\u00e9 \U0001F600", binding::NEWOBJ},
-                      WideCase{"'plain'", L"plain", binding::NEWOBJ},
-                      WideCase{"u'cut\\0here'", L"cut", binding::NEWOBJ},
-                      WideCase{"None", nullptr, -1}));
 
 TEST(AsWideString, TakesTheStringBehindAWideCharPointerWithoutCopying) {
   wchar_t text[] = L"pointed";
