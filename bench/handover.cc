@@ -256,10 +256,11 @@ int main() {
   const RateSummary rates = PrintRates(proxy);
 
   const double worstUi = std::max(full.dispatchMicros, rates.worstUiMicros);
-  const double uiCapacity = 1e6 / worstUi;
+  // With reports queued up, as at capacity, each costs what a burst shows.
+  const double uiCapacity = 1e6 / full.dispatchMicros;
   std::printf("\ntarget: UI thread time per report < %.0f us: worst %.2f us, %s\n", kTargetMicros,
               worstUi, worstUi < kTargetMicros ? "met" : "MISSED");
-  std::printf("the UI kept up with %.0f reports/s; at its worst cost it could take %.0f/s\n",
+  std::printf("the UI kept up with %.0f reports/s; at its burst cost it could take %.0f/s\n",
               rates.sustained, uiCapacity);
   std::printf("ratios: ui_per_report/target %.3f  python_call/dispatch_only %.2f  "
               "ui_capacity/worker_flat_out %.2f\n",

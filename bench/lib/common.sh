@@ -9,8 +9,8 @@ export PYTHONPATH="$build/python:$top/examples:$top/tests/python:$top/bench/lib"
 build_targets() {
   "$top/scripts/install-deps" >/dev/null
   if [[ ! -f $build/CMakeCache.txt ]]; then
-    "$top/scripts/build"
+    "$top/scripts/build" >&2
   else
-    cmake --build "$build" --parallel "$(nproc)" --target "$@"
+    cmake --build "$build" --parallel "$(nproc)" --target "$@" >&2
   fi
 }
