@@ -33,6 +33,8 @@ def upload_template(url=u'', error=u''):
 class SuccessfulUpload(UploadTest):
 
     def test_the_service_receives_every_field_and_file_byte_for_byte_in_order(self):
+        # Files of 100 MiB, 0 bytes (sent twice) and 1 byte among them.
+        self.replace_files(preset_size=100 * 1024 * 1024, image_sizes=[0, 1] + [1000] * 10)
         self.assertEqual(self.start(), 1)
         self.assertEqual(wait_for_completion(self.reports),
                          (u'PROGRESS', u'UploadComplete', 100, 1, FIRST_URL, u''))
@@ -159,12 +161,16 @@ class FailedUploads(UploadTest):
 
 class RefusedStarts(UploadTest):
 
-    def assert_nothing_started(self, uploader=None):
+    def assert_nothing_started(self):
         pump(0.3)
         self.assertEqual(self.reports.items, [])
         self.assertEqual(self.uploads(), [])
 
     def test_a_missing_preset_or_one_of_the_first_four_images_changes_nothing(self):
+        self.start()
+        wait_for_completion(self.reports)
+        self.svc.reset()
+        self.reports.items = []
         for index in range(5):
             for absent in (self.files.missing(), None):
                 files = [self.files.preset] + list(self.files.images)
@@ -172,18 +178,7 @@ class RefusedStarts(UploadTest):
                 self.assertEqual(self.start(preset=files[0], images=files[1:]), 0,
                                  (index, absent))
         self.assert_nothing_started()
-
-    def test_a_missing_image3_after_an_upload_keeps_its_url(self):
-        self.start()
-        wait_for_completion(self.reports)
-        self.reports.items = []
-        images = list(self.files.images)
-        images[2] = self.files.missing()
-        self.assertEqual(self.start(images=images), 0)
-        pump(0.3)
-        self.assertEqual(self.reports.items, [])
         self.assertEqual(self.uploader.GetUploadedFileUrl(), FIRST_URL)
-        self.assertEqual(len(self.uploads()), 1)
 
     def test_a_server_host_that_gives_no_acceptable_url_changes_nothing(self):
         longest = u'h' * (259 - len(u'http://') - len(UPLOAD_PATH))
