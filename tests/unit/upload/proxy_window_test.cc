@@ -4,64 +4,25 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <atomic>
 #include <memory>
-#include <sstream>
 #include <string>
 #include <thread>
 #include <vector>
 
 #include "platform/message_queue.h"
-#include "platform/text.h"
+#include "support/recording_listener.h"
 
 namespace {
 
 // Writes down each event it receives, and on which thread.
-class Target : public BackgroundUploadProgress {
+class Target : public test_support::BasicRecordingListener<BackgroundUploadProgress> {
  public:
-  std::vector<std::string> log;
-  std::vector<std::thread::id> threads;
-  std::atomic<bool> cancelled{false};
   std::unique_ptr<CUploadProgressProxyWindow>* destroyOnCompletion = nullptr;
 
-  void OnResolvingName(const wchar_t* text) override { Note("ResolvingName", text); }
-  void OnNameResolved(const wchar_t* text) override { Note("NameResolved", text); }
-  void OnConnectingToServer(const wchar_t* text) override { Note("Connecting", text); }
-  void OnConnectedToServer(const wchar_t* text) override { Note("Connected", text); }
-  void OnSendingRequest() override { Note("SendingRequest"); }
-  void OnRequestSent(std::uint32_t bytes) override { Note("RequestSent", bytes); }
-  void OnReceivingResponse() override { Note("ReceivingResponse"); }
-  void OnResponseReceived(std::uint32_t bytes) override { Note("ResponseReceived", bytes); }
-  void OnClosingConnection() override { Note("Closing"); }
-  void OnConnectionClosed() override { Note("Closed"); }
-  void OnFileBegin(const wchar_t* path) override { Note("FileBegin", path); }
-  void OnFileProgress(const wchar_t* path, std::uint32_t a, std::uint32_t b, std::uint32_t c,
-                      std::uint32_t d, std::uint32_t e, std::uint32_t f, std::uint32_t g) override {
-    Note("FileProgress", path, a, b, c, d, e, f, g);
-  }
-  void OnFileComplete(const wchar_t* path, std::int32_t result) override {
-    Note("FileComplete", path, result);
-  }
-  bool IsCancelled() override { return cancelled; }
-  void OnReservedEvent() override { Note("Reserved"); }
+  void OnReservedEvent() override { Add("Reserved"); }
   void OnBackgroundUploadComplete(std::int32_t result) override {
-    Note("Complete", result);
+    Add("Complete " + std::to_string(result));
     if (destroyOnCompletion) destroyOnCompletion->reset();
-  }
-
- private:
-  template <typename... Values>
-  void Note(const char* event, const Values&... values) {
-    std::ostringstream line;
-    line << event;
-    ((line << ' ' << Text(values)), ...);
-    log.push_back(line.str());
-    threads.push_back(std::this_thread::get_id());
-  }
-  static std::string Text(const wchar_t* text) { return text::WideToUtf8(text::WideView(text)); }
-  template <typename Number>
-  static Number Text(Number value) {
-    return value;
   }
 };
 
@@ -99,17 +60,17 @@ void RaiseEveryEvent(BackgroundUploadProgress& listener) {
 const std::vector<std::string> kEveryEvent = {
     "ResolvingName host",
     "NameResolved 127.0.0.5",
-    "Connecting 127.0.0.5",
-    "Connected 127.0.0.5",
+    "ConnectingToServer 127.0.0.5",
+    "ConnectedToServer 127.0.0.5",
     "SendingRequest",
     "RequestSent 321",
     "FileBegin /tmp/preset",
     "FileProgress /tmp/preset 1 2 3 4 5 6 7",
-    "FileComplete /tmp/preset -2147024894",
+    "FileComplete /tmp/preset 0x80070002",
     "ReceivingResponse",
     "ResponseReceived 654",
-    "Closing",
-    "Closed",
+    "ClosingConnection",
+    "ConnectionClosed",
     "Reserved",
     "Complete -2147220735",
 };
@@ -137,9 +98,9 @@ class ProxyWindowTest : public ::testing::Test {
 TEST_F(ProxyWindowTest, EventsArriveInOrderOnTheWindowsThreadWithTheirArgumentsCopied) {
   ASSERT_TRUE(proxy->CreateHiddenWindow());
   RaiseOnWorker();
-  EXPECT_TRUE(target.log.empty());  // nothing runs before the owner dispatches
+  EXPECT_TRUE(target.events.empty());  // nothing runs before the owner dispatches
   EXPECT_EQ(ui::MessageQueue::DispatchPending(), kEveryEvent.size());
-  EXPECT_EQ(target.log, kEveryEvent);
+  EXPECT_EQ(target.events, kEveryEvent);
   for (const std::thread::id& thread : target.threads)
     EXPECT_EQ(thread, std::this_thread::get_id());
 }
@@ -151,21 +112,21 @@ TEST_F(ProxyWindowTest, TheFilterDropsOnlyTheTwoRequestNotifications) {
   ASSERT_TRUE(proxy->CreateHiddenWindow());
   RaiseOnWorker();
   ui::MessageQueue::DispatchPending();
-  EXPECT_EQ(target.log, Without(kEveryEvent, {"SendingRequest", "RequestSent 321"}));
+  EXPECT_EQ(target.events, Without(kEveryEvent, {"SendingRequest", "RequestSent 321"}));
 
-  target.log.clear();
+  target.events.clear();
   proxy->SetEventFilter(CUploadProgressProxyWindow::kForwardRequestSent);
   RaiseOnWorker();
   ui::MessageQueue::DispatchPending();
-  EXPECT_EQ(target.log, Without(kEveryEvent, {"SendingRequest"}));
+  EXPECT_EQ(target.events, Without(kEveryEvent, {"SendingRequest"}));
 }
 
 TEST_F(ProxyWindowTest, TheCancelPollIsAnsweredAtOnceWithoutAMessage) {
   ASSERT_TRUE(proxy->CreateHiddenWindow());
+  target.cancelAt = [](int poll) { return poll == 2; };
   std::vector<bool> answers;
   std::thread worker([&] {
     answers.push_back(proxy->IsCancelled());
-    target.cancelled = true;
     answers.push_back(proxy->IsCancelled());
   });
   worker.join();
@@ -178,12 +139,12 @@ TEST_F(ProxyWindowTest, CommandsQueuedWhenTheWindowIsDestroyedNeverRun) {
   RaiseOnWorker();
   proxy->DestroyWindow();  // the leak checker sees the dropped commands freed
   EXPECT_EQ(ui::MessageQueue::DispatchPending(), 0u);
-  EXPECT_TRUE(target.log.empty());
+  EXPECT_TRUE(target.events.empty());
 
   RaiseOnWorker();  // without a window the events go nowhere
   proxy.reset();
   EXPECT_EQ(ui::MessageQueue::DispatchPending(), 0u);
-  EXPECT_TRUE(target.log.empty());
+  EXPECT_TRUE(target.events.empty());
 }
 
 TEST_F(ProxyWindowTest, TheCompletionHandlerMayDestroyTheProxyItRunsIn) {
@@ -192,7 +153,7 @@ TEST_F(ProxyWindowTest, TheCompletionHandlerMayDestroyTheProxyItRunsIn) {
   RaiseOnWorker();
   EXPECT_EQ(ui::MessageQueue::DispatchPending(), kEveryEvent.size());
   EXPECT_EQ(proxy, nullptr);
-  EXPECT_EQ(target.log.back(), "Complete -2147220735");
+  EXPECT_EQ(target.events.back(), "Complete -2147220735");
 }
 
 }  // namespace
