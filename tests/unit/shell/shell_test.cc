@@ -8,11 +8,16 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <filesystem>
 #include <fstream>
+#include <optional>
 #include <sstream>
 #include <string>
 #include <thread>
 #include <vector>
+
+#include "support/temp_folder.h"
+#include "support/trace_capture.h"
 
 namespace {
 
@@ -25,26 +30,15 @@ constexpr auto kPoll = std::chrono::milliseconds(10);
 constexpr char kRecorder[] =
     "#!/bin/sh\nprintf '%s\\0' \"$@\" > \"$0.tmp\" && mv \"$0.tmp\" \"$0.out\"\n";
 
-// A temporary folder with recorder scripts, BROWSER and PATH set for one test.
-class LinkOpening : public ::testing::Test {
+// A temporary working folder with recorder scripts in bin/, which alone is on
+// PATH besides the system folders; BROWSER is unset.
+class LinkOpening : public test_support::TempFolderTest {
  protected:
   void SetUp() override {
-    char pattern[] = "/tmp/shell_test.XXXXXX";
-    ASSERT_NE(mkdtemp(pattern), nullptr);
-    dir_ = pattern;
-    for (const char* name : {"BROWSER", "PATH"}) {
-      const char* value = getenv(name);
-      saved_.emplace_back(name, value ? value : "");
-    }
-    setenv("PATH", (dir_ + "/bin:/usr/bin:/bin").c_str(), 1);
-    unsetenv("BROWSER");
-    mkdir((dir_ + "/bin").c_str(), 0700);
-  }
-
-  void TearDown() override {
-    for (const auto& [name, value] : saved_) setenv(name.c_str(), value.c_str(), 1);
-    std::string command = "rm -rf '" + dir_ + "'";
-    ASSERT_EQ(std::system(command.c_str()), 0);
+    TempFolderTest::SetUp();
+    dir_ = std::filesystem::current_path().string();
+    std::filesystem::create_directory("bin");
+    path_.emplace("PATH", dir_ + "/bin:/usr/bin:/bin");
   }
 
   // A recorder script on PATH under this name; returns its full path.
@@ -72,7 +66,8 @@ class LinkOpening : public ::testing::Test {
   }
 
   std::string dir_;
-  std::vector<std::pair<std::string, std::string>> saved_;
+  std::optional<test_support::ScopedEnv> path_;
+  test_support::ScopedEnv browser_{"BROWSER", std::nullopt};
 };
 
 struct BrowserCase {

@@ -35,7 +35,7 @@ class TempFolderTest : public ::testing::Test {
   void SetUp() override {
     previous_ = std::filesystem::current_path();
     folder_ = std::filesystem::temp_directory_path() /
-              ("transport_test_" + std::to_string(::getpid()));
+              ("unit_test_" + std::to_string(::getpid()));
     std::filesystem::remove_all(folder_);
     std::filesystem::create_directories(folder_);
     std::filesystem::current_path(folder_);
