@@ -29,12 +29,6 @@ class TraceSwitch(unittest.TestCase):
                 self.run_session(trace)
                 self.assertEqual(trace.lines(), lines, 'DumpMsg %r' % (dump_msg,))
 
-    def test_hive_written_by_the_registry_editor(self):
-        with TraceRun() as trace:
-            trace.set_switch(1, utf16=True)
-            self.run_session(trace)
-            self.assertEqual(trace.lines(), VERSION_LINES)
-
     def test_the_switch_is_read_again_at_each_construction(self):
         with TraceRun(1) as trace:
             self.run_session(trace, """

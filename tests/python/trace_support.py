@@ -7,7 +7,6 @@ lines go to a file (PYUPLOADER_DEBUG_OUTPUT), both in a temporary folder.
 Suites that handle accounts, passwords or tokens run their scenario under a
 TraceRun with the switch on and call assert_secret_absent for each secret.
 """
-import codecs
 import os
 import shutil
 import subprocess
@@ -37,7 +36,8 @@ class TraceRun(object):
         self.folder = tempfile.mkdtemp(prefix='trace-')
         self.hive = os.path.join(self.folder, 'registry.reg')
         self.output = os.path.join(self.folder, 'debug.log')
-        self.set_switch(dump_msg)
+        with open(self.hive, 'wb') as hive:
+            hive.write(hive_text(dump_msg).encode('ascii'))
 
     def __enter__(self):
         return self
@@ -45,12 +45,6 @@ class TraceRun(object):
     def __exit__(self, *exc):
         shutil.rmtree(self.folder, ignore_errors=True)
         return False
-
-    def set_switch(self, dump_msg, utf16=False):
-        text = hive_text(dump_msg)
-        data = codecs.BOM_UTF16_LE + text.encode('utf-16-le') if utf16 else text.encode('ascii')
-        with open(self.hive, 'wb') as hive:
-            hive.write(data)
 
     def environment(self, capture=True):
         env = dict(os.environ, PYUPLOADER_REGISTRY=self.hive)

@@ -9,15 +9,6 @@
 
 namespace {
 
-TEST(UploadForm, StartsEmptyWithTheInitialSpeed) {
-  const UploadRequest request;
-  EXPECT_EQ(request.rateEstimate, 5600u);
-  EXPECT_TRUE(request.host.empty());
-  EXPECT_TRUE(request.path.empty());
-  EXPECT_TRUE(request.fields.empty());
-  EXPECT_TRUE(request.files.empty());
-}
-
 TEST(UploadForm, FieldsAreUniqueAndHeldInUnsignedByteOrder) {
   UploadRequest request;
   for (const char* name : {"title", "category", "AP", "\xC3\xA9t\xC3\xA9", "Version"}) {

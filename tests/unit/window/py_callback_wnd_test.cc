@@ -24,20 +24,14 @@ class RecordingWnd : public PyCallbackWnd {
   std::vector<std::intptr_t> received;
 };
 
-TEST(PyCallbackWndTest, ObjectsShareTheWindowClassButEachHasItsOwnWindow) {
-  RecordingWnd first, second;
-  EXPECT_EQ(first.window().ClassName(), L"Callback Window");
-  EXPECT_EQ(second.window().ClassName(), L"Callback Window");
-  EXPECT_EQ(first.window().UserData(), &first);
-  EXPECT_EQ(second.window().UserData(), &second);
-  EXPECT_EQ(first.mark(), PyCallbackWnd::kLiveMark);
-
-  RecordingWnd named(L"Named Callback Window");
-  EXPECT_EQ(named.window().ClassName(), L"Named Callback Window");
-}
-
-TEST(PyCallbackWndTest, MessagesReachTheObjectsWindowProcedure) {
+TEST(PyCallbackWndTest, EachObjectHasItsOwnWindowOfTheSharedClassAndGetsItsMessages) {
   RecordingWnd target, bystander;
+  EXPECT_EQ(target.window().ClassName(), L"Callback Window");
+  EXPECT_EQ(bystander.window().ClassName(), L"Callback Window");
+  EXPECT_EQ(target.window().UserData(), &target);
+  EXPECT_EQ(target.mark(), PyCallbackWnd::kLiveMark);
+  EXPECT_EQ(RecordingWnd(L"Named Callback Window").window().ClassName(), L"Named Callback Window");
+
   target.window().Post(kMessage, 1, 2);
   ui::MessageQueue::DispatchPending();
   EXPECT_EQ(target.received, (std::vector<std::intptr_t>{kMessage + 3}));
@@ -53,7 +47,6 @@ TEST(PyCallbackWndTest, AWindowWithoutItsObjectGetsDefaultProcessing) {
 }
 
 TEST(PyCallbackWndTest, MessagesQueuedForADestroyedObjectAreNeverDelivered) {
-  std::vector<std::intptr_t> survivorLog;
   {
     RecordingWnd doomed;
     doomed.window().Post(kMessage, 0, 0);
