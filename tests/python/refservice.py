@@ -129,21 +129,11 @@ class RefService(object):
     def tls(self, cert):
         self._call('/tls', {'cert': cert})
 
-    def requests(self, host=None, path=None, since=0, bodies=True):
+    def requests(self, host=None, path=None, bodies=True):
         """Recorded requests in arrival order; bodies=False leaves out the
         bodies and part contents (as None), which makes polling cheap."""
-        query = self._query(host=host, path=path, since=since, bodies=None if bodies else '0')
+        query = self._query(host=host, path=path, bodies=None if bodies else '0')
         return [Request(r) for r in self._call('/requests' + query)['requests']]
-
-    def wait_for_requests(self, count=1, host=None, path=None, timeout=10.0, ready=None):
-        """Polls until count requests match (and ready(request) holds for
-        each, if given); returns them. Raises AssertionError on time-out."""
-        def enough():
-            found = [r for r in self.requests(host, path, bodies=False)
-                     if ready is None or ready(r)]
-            return len(found) >= count
-        wait_until(enough, timeout, '%d requests for %s%s' % (count, host or '*', path or ''))
-        return [r for r in self.requests(host, path) if ready is None or ready(r)]
 
     @staticmethod
     def _query(**values):
