@@ -4,8 +4,6 @@
 // make the TraceCapture before constructing the object under test.
 #pragma once
 
-#include <gtest/gtest.h>
-
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -111,11 +109,6 @@ class TraceCapture {
 
   std::string Bytes() const { return output_.Read(); }
   std::wstring Text() const { return text::Utf8ToWide(Bytes()); }
-
-  // Fails the current test when `secret` appears in the captured lines.
-  void ExpectAbsent(const std::wstring& secret) const {
-    EXPECT_EQ(Text().find(secret), std::wstring::npos) << "the trace carries a secret";
-  }
 
  private:
   TempFile hive_;

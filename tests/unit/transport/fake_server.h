@@ -28,7 +28,6 @@ struct FakeServer {
   std::uint32_t announced = 0;
   std::vector<std::string> writes;
   bool ended = false;
-  std::uint32_t sleptMs = 0;
 
   std::string Body() const {
     std::string body;
@@ -80,10 +79,7 @@ class FakeConnection : public UploadConnection {
 inline UploadEnvironment FakeServer::Environment() {
   return UploadEnvironment{
       [this] { return now; },
-      [this](std::uint32_t ms) {
-        now += ms;
-        sleptMs += ms;
-      },
+      [this](std::uint32_t ms) { now += ms; },
       [this](const UploadRequest&, UploadProgress*, std::unique_ptr<UploadConnection>* out) {
         *out = std::make_unique<FakeConnection>(*this);
         return win::kOk;

@@ -118,13 +118,4 @@ TEST(EmptyDocument, HasNoChildrenAndFindsNothing) {
   EXPECT_FALSE(xml::Document(L"<a/>").empty());
 }
 
-TEST(MovedDocument, KeepsItsTree) {
-  xml::Document source(L"<a>x</a>");
-  xml::Document moved(std::move(source));
-  EXPECT_EQ(moved.NodeText("a").text, L"x");
-  xml::Document assigned;
-  assigned = std::move(moved);
-  EXPECT_EQ(assigned.NodeText("a").text, L"x");
-}
-
 }  // namespace
