@@ -13,12 +13,16 @@ SLOW_READ = 1024 * 1024  # bytes per second
 QUIET_AFTER = 1.0  # seconds in which no further report may arrive
 
 
-class CancelledUpload(UploadTest):
+class SlowUpload(UploadTest):
+    """A large preset that the service reads slowly."""
 
     def setUp(self):
         UploadTest.setUp(self)
         self.replace_files(preset_size=LARGE_PRESET)
         self.slow_reader(SLOW_READ)
+
+
+class CancelledUpload(SlowUpload):
 
     def test_a_cancel_while_streaming_completes_with_failure_and_nothing_after(self):
         self.assertEqual(self.start(), 1)
@@ -48,12 +52,7 @@ class CancelledUpload(UploadTest):
         self.assertEqual(self.uploader.GetUploadedFileUrl(), u'')
 
 
-class DestroyedUploader(UploadTest):
-
-    def setUp(self):
-        UploadTest.setUp(self)
-        self.replace_files(preset_size=LARGE_PRESET)
-        self.slow_reader(SLOW_READ)
+class DestroyedUploader(SlowUpload):
 
     def test_deleting_waits_for_the_worker_and_the_callable_hears_nothing_more(self):
         threads_before = worker_threads()
