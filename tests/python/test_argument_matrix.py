@@ -42,7 +42,8 @@ SIGNATURES = dict(
      ('OBLoginData_GetEffectByGUID', [SESSION, UNICODE]),
      ('OBLoginData_m_bServerReachable_set', [SESSION_SETTER, integer('BOOL')]),
      ('OBLoginData_m_szChkServerUrl_set', [SESSION, ARRAY]),
-     ('new_PyPresetUploader', [WIDE] * 5), ('delete_PyPresetUploader', [ptr('PyPresetUploader', SKIP)]),
+     ('new_PyPresetUploader', [WIDE] * 5),
+     ('delete_PyPresetUploader', [ptr('PyPresetUploader', SKIP)]),
      ('PyPresetUploader_SetCallback', [UPLOADER, OBJECT]),
      ('PyPresetUploader_StartUpload', [UPLOADER] + [WIDE] * 18),
      ('PyPresetUploader_swigregister', [OBJECT])]
@@ -96,7 +97,7 @@ SINGLETONS = ('None', 'bool', 'int')
 
 def outcome(kind, value_name):
     """What the conversion of kind does with the value: None (accepted, not
-    called), ('returns', 'None'), ('unicode error',) or (exception, C type)."""
+    called), ('returns', 'None'), ('unicode error', None) or (exception, C type)."""
     name = kind[0]
     if name == 'object':
         return None
@@ -110,7 +111,7 @@ def outcome(kind, value_name):
         return None if value_name == 'unicode' else (TypeError, None)
     if name == 'wide':
         if value_name == 'undecodable str':
-            return ('unicode error',)
+            return ('unicode error', None)
         accepted = ('str', 'unicode', 'None', 'long str')
         return None if value_name in accepted else (TypeError, 'wchar_t const *')
     if name == 'int':
@@ -119,12 +120,14 @@ def outcome(kind, value_name):
     return None if value_name in accepted else (TypeError, 'char [_MAX_PATH]')
 
 
-def message(function, position, expected):
+def expected_result(function, position, expected):
     error, c_type = expected
+    if error in ('returns', 'unicode error'):
+        return expected
     if c_type is None:
-        return 'Unicode string expected'
+        return (error, 'Unicode string expected')
     text = "in method '%s', argument %d of type '%s'" % (function, position, c_type)
-    return ('invalid null reference ' if error is ValueError else '') + text
+    return (error, ('invalid null reference ' if error is ValueError else '') + text)
 
 
 class ArgumentMatrix(unittest.TestCase):
@@ -137,7 +140,8 @@ class ArgumentMatrix(unittest.TestCase):
         self.uploader = native.new_PyPresetUploader(*[u'x'] * 5)
         pointers = {'CString': self.text, 'OBLoginData': self.session, 'HINTERNET': self.handle,
                     'infoEffectURL': self.record, 'PyPresetUploader': self.uploader}
-        self.values = dict(PLAIN_VALUES, **dict((name, lambda p=p: p) for name, p in pointers.items()))
+        self.values = dict(PLAIN_VALUES)
+        self.values.update((name, lambda p=p: p) for name, p in pointers.items())
         self.valid = dict(pointers, unicode=u'x', wide=u'x', int=1, array='x', object=None)
 
     def tearDown(self):
@@ -159,7 +163,7 @@ class ArgumentMatrix(unittest.TestCase):
                     expected = outcome(kind, value_name)
                     if expected is not None:
                         found = self.call_with(function, kinds, position, value_name)
-                        wanted = self.expected_result(function, position, expected)
+                        wanted = expected_result(function, position, expected)
                         if found != wanted:
                             mismatches.append((function, position, value_name, found, wanted))
         self.assertEqual(mismatches, [])
@@ -172,19 +176,13 @@ class ArgumentMatrix(unittest.TestCase):
         try:
             found = ('returns', repr(getattr(native, function)(*args)))
         except UnicodeDecodeError:
-            found = ('unicode error',)
+            found = ('unicode error', None)
         except (TypeError, ValueError) as error:
             found = (type(error), str(error))
         del args
         if value_name not in SINGLETONS and sys.getrefcount(value) != references:
             found += ('reference kept',)
         return found
-
-    @staticmethod
-    def expected_result(function, position, expected):
-        if expected[0] in ('returns', 'unicode error'):
-            return expected
-        return (expected[0], message(function, position, expected))
 
     def test_a_wrong_number_of_arguments_is_refused_naming_the_function(self):
         for function, kinds in SIGNATURES.items():
