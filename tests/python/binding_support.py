@@ -91,6 +91,14 @@ class Relocated(object):
         return False
 
 
+class ErrorTextTest(unittest.TestCase):
+
+    def assertRaisesText(self, error, text, function, *args):
+        with self.assertRaises(error) as caught:
+            function(*args)
+        self.assertEqual(str(caught.exception), text)
+
+
 class Scenarios(unittest.TestCase):
     """Runs scenarios in fresh interpreters: `PRELUDE`, then the scenario's body."""
 
@@ -102,7 +110,7 @@ class Scenarios(unittest.TestCase):
         return out
 
 
-class WithRecord(unittest.TestCase):
+class WithRecord(ErrorTextTest):
     """Each test has `self.text`, a "CString *" made by the peer module, and
     `self.record`, an infoEffectURL made from it; both are deleted afterwards."""
 

@@ -19,8 +19,3 @@ class ServiceTest(SessionTest):
     def sent(self, path):
         """The requests the server host received for path, in order."""
         return self.svc.requests(host=SERVER_HOST, path=path)
-
-    def assertRaisesText(self, error, text, function, *args):
-        with self.assertRaises(error) as caught:
-            function(*args)
-        self.assertEqual(str(caught.exception), text)

@@ -9,10 +9,9 @@ import os
 import stat
 import threading
 import time
-import unittest
 
 import _PyUploader as native
-from binding_support import address_of
+from binding_support import ErrorTextTest, address_of
 from refservice import RefService, wait_until
 from trace_support import TraceRun
 
@@ -36,7 +35,7 @@ def info_xml(root='INFO', **fields):
     return '<%s>%s</%s>' % (root, elements, root)
 
 
-class SessionTest(unittest.TestCase):
+class SessionTest(ErrorTextTest):
     """Each test starts with the plausible service, the trace on and a new session."""
 
     def setUp(self):

@@ -3,7 +3,6 @@ that only grows, and the name look-up."""
 import unittest
 
 import _PyUploaderTestPeer as peer
-import _PyUploader as native
 from catalog_support import ServiceTest
 from refservice import DETECTION_HOST, SERVER_HOST, reply, xml_reply
 from service_session import Ticker
@@ -52,11 +51,6 @@ class Request(CategoryTest):
         [request] = self.sent(PATH)
         self.assertEqual(request.target, PATH + '?Locid=' + 'L' * 3000 + '&Version=5.0')
 
-    def test_only_unicode_languages_are_taken(self):
-        for language in ('ENU', None):
-            self.assertRaisesText(TypeError, 'Unicode string expected',
-                                  native.OBLoginData_GetPresetCategory, self.session, language)
-        self.assertEqual(self.sent(PATH), [])
 
 
 class Replies(CategoryTest):
@@ -119,17 +113,6 @@ class NameLookup(CategoryTest):
         self.assertEqual(self.name_of(True, u'x'), (0, u'x'))  # id 1
         self.assertEqual(self.name_of(70), (0, u'unchanged'))
 
-    def test_needs_a_string_object_and_an_integer_id(self):
-        text = peer.new_CString(u'')
-        try:
-            self.assertRaisesText(ValueError, "invalid null reference in method "
-                                  "'OBLoginData_GetCategroyName', argument 3 of type 'CString &'",
-                                  native.OBLoginData_GetCategroyName, self.session, 0, None)
-            self.assertRaisesText(TypeError, "in method 'OBLoginData_GetCategroyName', argument 2 "
-                                  "of type 'int'", native.OBLoginData_GetCategroyName,
-                                  self.session, 1.5, text)
-        finally:
-            peer.delete_CString(text)
 
 
 class InterpreterLock(ServiceTest):

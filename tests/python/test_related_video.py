@@ -2,7 +2,6 @@
 details appended last; what is sent and returned for each kind of reply."""
 import unittest
 
-import _PyUploader as native
 from catalog_support import ServiceTest
 from refservice import SERVER_HOST, reply, xml_reply
 
@@ -75,11 +74,6 @@ class RelatedVideo(ServiceTest):
         self.svc.host_state(SERVER_HOST, 'down')
         self.assertIsNone(self.relate())
 
-    def test_only_unicode_arguments_are_taken(self):
-        for args in (('v', u's', u'd'), (u'v', None, u'd'), (u'v', u's', 5)):
-            self.assertRaisesText(TypeError, 'Unicode string expected',
-                                  native.OBLoginData_SetRelateVideo, self.session, *args)
-        self.assertEqual(self.svc.requests(), [])
 
 
 class TraceLines(ServiceTest):

@@ -255,28 +255,6 @@ class ModuleFunctions(UploadTest):
         upload = self.uploads()[0].upload
         self.assertEqual((upload.field('title'), upload.field('token')), (texts['title'], '0123'))
 
-    def test_unusable_arguments_raise_the_modules_error_texts(self):
-        session = native.new_OBLoginData(u'5.0', u'', u'')
-        texts = [u''] * 18
-        cases = [
-            (native.PyPresetUploader_StartUpload, [self.uploader] + texts[:17] + [5],
-             TypeError, "in method 'PyPresetUploader_StartUpload', argument 19 of type "
-                        "'wchar_t const *'"),
-            (native.PyPresetUploader_CancelUpload, [session],
-             TypeError, "in method 'PyPresetUploader_CancelUpload', argument 1 of type "
-                        "'PyPresetUploader *'"),
-            (native.PyPresetUploader_GetUploadedFileUrl, [None],
-             ValueError, "invalid null reference in method 'PyPresetUploader_GetUploadedFileUrl', "
-                         "argument 1 of type 'PyPresetUploader *'"),
-            (native.new_PyPresetUploader, [u'', u'', 1.5, u'', u''],
-             TypeError, "in method 'new_PyPresetUploader', argument 3 of type 'wchar_t const *'"),
-        ]
-        for function, args, error, text in cases:
-            with self.assertRaises(error) as raised:
-                function(*args)
-            self.assertEqual(str(raised.exception), text)
-        native.delete_OBLoginData(session)
-
     def test_results_of_the_plain_functions(self):
         self.assertEqual(native.PyPresetUploader_SetCallback(self.uploader, None), 1)
         self.assertIsNone(native.PyPresetUploader_CancelUpload(self.uploader))
