@@ -20,10 +20,6 @@ INSTANTIATE_TEST_SUITE_P(
     ::testing::Values(Utf8Case{"", L""}, Utf8Case{"abc", L"abc"},
                       Utf8Case{"\xC3\xA4", L"\u00E4"}, Utf8Case{"\xE4\xB8\xAD", L"\u4E2D"},
                       Utf8Case{"\xF0\x9F\x98\x80", L"\U0001F600"},
-                      Utf8Case{"a\xFFz", L"a\uFFFDz"},           // invalid lead byte
-                      Utf8Case{"\xC3", L"\uFFFD"},               // cut short at the end
-                      Utf8Case{"\xC0\xAF", L"\uFFFD"},           // overlong slash
-                      Utf8Case{"\xED\xA0\x80", L"\uFFFD"},       // encoded surrogate
                       Utf8Case{std::string("a\0b", 3), std::wstring(L"a\0b", 3)}));
 
 TEST(Utf8Encoding, RoundTripsEveryPlaneAndReplacesSurrogates) {

@@ -24,7 +24,6 @@ namespace test_support {
 struct ScriptedReply {
   std::vector<std::string> pieces;  // sent in order once the request has been read
   int pauseMs = 0;                  // between two pieces
-  std::size_t hangUpAfterBodyBytes = std::string::npos;  // close without answering
   bool silent = false;              // read the request, then never answer
 };
 
@@ -92,7 +91,7 @@ class LoopbackServer {
   }
 
   void Answer(int connection, const ScriptedReply& reply, std::string* received) {
-    if (!ReadRequest(connection, reply, received)) return;
+    if (!ReadRequest(connection, received)) return;
     if (reply.silent) {
       while (!stop_) std::this_thread::sleep_for(std::chrono::milliseconds(kPollMs));
       return;
@@ -103,20 +102,18 @@ class LoopbackServer {
     }
   }
 
-  // Reads the head and as much of the announced body as the script wants;
-  // false when the script hangs up first.
-  bool ReadRequest(int connection, const ScriptedReply& reply, std::string* received) {
+  // Reads the head and the announced body; false when the client hangs up first.
+  bool ReadRequest(int connection, std::string* received) {
     std::size_t head_end = std::string::npos;
     while ((head_end = received->find("\r\n\r\n")) == std::string::npos) {
       if (!ReadSome(connection, received)) return false;
     }
     const std::size_t body_start = head_end + 4;
     const std::size_t wanted = ContentLength(received->substr(0, body_start));
-    const std::size_t limit = std::min(wanted, reply.hangUpAfterBodyBytes);
-    while (received->size() - body_start < limit) {
+    while (received->size() - body_start < wanted) {
       if (!ReadSome(connection, received)) return false;
     }
-    return limit == wanted;
+    return true;
   }
 
   static std::size_t ContentLength(std::string head) {
