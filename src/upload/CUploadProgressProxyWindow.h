@@ -15,7 +15,7 @@ class Window;
 }
 class Command;
 
-class CUploadProgressProxyWindow : public BackgroundUploadProgress {
+class CUploadProgressProxyWindow final : public BackgroundUploadProgress {
  public:
   static constexpr std::uint32_t WM_APP = 0x8000;
   static constexpr std::uint32_t WM_UPLOAD_COMMAND = WM_APP + 42;
