@@ -44,9 +44,7 @@ TEST_P(ProgressReportsTest, ProgressCarriesTheWholePercentOfAllFilesAndTheFilesT
 
 INSTANTIATE_TEST_SUITE_P(Percentages, ProgressReportsTest,
                          ::testing::Values(ProgressCase{333, 1000, 9, "33, 9"},
-                                           ProgressCase{0, 1000, 0, "0, 0"},
                                            ProgressCase{2, 3, 1, "66, 1"},
-                                           ProgressCase{1000, 1000, 0, "100, 0"},
                                            ProgressCase{0xFFFFFFFFu, 0xFFFFFFFFu, 0, "100, 0"},
                                            // Nothing to send is all sent, never a division by zero.
                                            ProgressCase{0, 0, 0, "100, 0"}));
