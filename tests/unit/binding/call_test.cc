@@ -30,6 +30,8 @@ struct Received {
   PyObject* object = nullptr;
 } g_received;
 
+Thing g_thing;
+
 PointerKind<Thing> ThingArg(OnNull onNull = OnNull::kRefuse) {
   return Pointer<Thing>(Type(TestType::Thing), "Thing *", onNull);
 }
@@ -63,42 +65,26 @@ PyObject* SetName(PyObject*, PyObject* args) {
               ThingArg(OnNull::kSkipCall), Reference<std::wstring>(Type(TestType::CString), "CString &"));
 }
 
-PyObject* NewThing(PyObject*, PyObject* args) {
-  return Call(args, "new_Thing", NewPointer(Type(TestType::Thing), POINTER_OWN | POINTER_NOSHADOW),
-              [](const wchar_t* name) { return new Thing{name}; }, Unicode());
-}
-
-PyObject* DeleteThing(PyObject*, PyObject* args) {
-  return Delete<Thing>(args, "delete_Thing", Type(TestType::Thing), "Thing *");
-}
-
-PyObject* RegisterThing(PyObject*, PyObject* args) { return Register(args, Type(TestType::Thing)); }
-
 PyMethodDef g_functions[] = {
     {"kinds", Kinds, METH_VARARGS, nullptr},
     {"set_name", SetName, METH_VARARGS, nullptr},
-    {"new_Thing", NewThing, METH_VARARGS, nullptr},
-    {"delete_Thing", DeleteThing, METH_VARARGS, nullptr},
-    {"Thing_swigregister", RegisterThing, METH_VARARGS, nullptr},
     {nullptr, nullptr, 0, nullptr},
 };
 
 class CallSequence : public ::testing::Test {
  protected:
   static void SetUpTestSuite() {
-    Type(TestType::Thing);  // the table first
     Py_InitModule4("calltest", g_functions, nullptr, nullptr, 1013);
+    PyRef thing(binding_test::PointerTo(&g_thing, TestType::Thing));
+    PyDict_SetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), "thing", thing.get());
     test_support::RunPython(
         "import calltest\n"
-        "class Thing(object):\n"
-        "    __swig_destroy__ = calltest.delete_Thing\n"
-        "    def __init__(self, name):\n"
-        "        self.this = calltest.new_Thing(name)\n"
-        "calltest.Thing_swigregister(Thing)\n"
-        "thing = Thing(u'four')\n"
         "good = (thing, u'uni', u'wide', 3, True, 'bytes', None)\n");
   }
-  void SetUp() override { g_received = Received(); }
+  void SetUp() override {
+    g_received = Received();
+    g_thing.name = L"four";
+  }
 
   // Runs `call` (an expression) and returns the error it raised as "Type: message".
   std::string ErrorOf(const std::string& call) {
