@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <limits>
-#include <new>
 
 #include "platform/file.h"
 #include "transport/UploadProgress.h"
@@ -211,10 +210,10 @@ void Uploader::ReadReply(UploadConnection& connection) {
 // Fresh memory costs a page fault per page when first touched. One block for
 // the whole upload, of which each read fills at most the current chunk size,
 // touches every page once rather than again at each change of the chunk size,
-// and never holds more than the largest chunk used.
+// and never holds more than the largest chunk used (rounded up to a huge page).
 char* Uploader::ChunkBuffer() {
-  if (!chunkBuffer_) chunkBuffer_.reset(new (std::nothrow) char[kChunkCeiling]);
-  return chunkBuffer_.get();
+  if (!chunkBuffer_) chunkBuffer_.emplace(kChunkCeiling);
+  return chunkBuffer_->data();
 }
 
 std::uint32_t Uploader::CurrentTick() const { return environment_.tickCount() / kMsPerTick; }

@@ -6,9 +6,11 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
+#include "platform/large_buffer.h"
 #include "platform/win_error.h"
 #include "transport/ChunkLog.h"
 #include "transport/UploadEnvironment.h"
@@ -81,5 +83,5 @@ class Uploader {
 
   UploadEnvironment environment_;
   ChunkLog chunkLog_;
-  std::unique_ptr<char[]> chunkBuffer_;  // kChunkCeiling bytes, made at the first file
+  std::optional<memory::LargeBuffer> chunkBuffer_;  // kChunkCeiling bytes, made at the first file
 };
