@@ -82,6 +82,19 @@ class ServiceInformation(DiscoveryTest):
                          u'http://%shttp://%s/forgetpwd&uuid=%s'
                          % (SERVER_HOST, DEFAULT_HOST, UUID))
 
+    def test_a_server_host_that_is_not_a_bare_host_name_is_refused(self):
+        refused = [u'api.orbishare.com:8080/evil?x=', u'user@api.orbishare.com',
+                   u'api.orbishare.com/path', u'api orbishare', u'api.orbishare.com?q', u'',
+                   u'\xe4pi.test']
+        for value in refused:
+            self.svc.reset()
+            self.call('LogoutOrbishare')
+            self.clear_trace()
+            self.answer_detection(xml_reply(info_xml(APIUrl=value.encode('utf-8'))))
+            self.assertEqual(self.discover(), unicode(STAGING_HOST), value)
+            self.assertEqual(self.trace_lines(), [
+                u'Update OBInfo fail: APIUrl is not a host name: ' + value] + FALLBACK_LINES)
+
     def test_a_root_spelled_info_yields_nothing(self):
         self.answer_detection(xml_reply(info_xml('info', **SIX_FIELDS)))
         self.assertEqual(self.discover(), unicode(STAGING_HOST))
