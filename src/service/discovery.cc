@@ -71,8 +71,8 @@ void OBLoginData::DetectServerInfo() {
     request.path += L"&versionType=" + service::EscapePathValue(m_strVersionType);
   }
   request.read = service::ReplyRead::kByLength;
-  const std::optional<std::string> reply = service::RunExchange(request);
-  if (reply) StoreServiceInfo(xml::Document(service::DecodeAnsiReply(*reply)));
+  std::optional<std::string> reply = service::RunExchange(request);
+  if (reply) StoreServiceInfo(xml::Document(service::DecodeAnsiReply(std::move(*reply))));
 }
 
 void OBLoginData::StoreServiceInfo(const xml::Document& reply) {
