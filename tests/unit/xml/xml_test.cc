@@ -121,6 +121,7 @@ TEST(EmptyDocument, HasNoChildrenAndFindsNothing) {
 TEST(ReadInPlace, AMovedDocumentStillReadsItsText) {
   xml::Document first(std::string("<a>x</a>"));  // short enough to live inside a string object
   const xml::Document moved(std::move(first));
+  first = xml::Document(std::string("<b>y</b>"));  // takes the first one's place
   EXPECT_EQ(moved.NodeText("a").text, L"x");
 }
 
