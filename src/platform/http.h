@@ -79,6 +79,9 @@ class Request {
   std::string HeaderValue(std::string_view name) const;
   // What has been read of the reply body.
   const std::string& body() const;
+  // The reply body moved out, so that a large one is not copied; body() is
+  // empty afterwards.
+  std::string TakeBody();
 
  private:
   class State;

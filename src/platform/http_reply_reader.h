@@ -25,6 +25,7 @@ class ReplyReader {
   std::uint32_t status_code() const { return head_received_ ? status_code_ : 0; }
   std::string HeaderValue(std::string_view name) const;
   const std::string& body() const { return body_; }
+  std::string TakeBody() { return std::move(body_); }
 
  private:
   static std::size_t OnHeader(char* data, std::size_t size, std::size_t count, void* self);

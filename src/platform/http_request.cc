@@ -56,6 +56,7 @@ class Request::State {
   win::Status End();
 
   const ReplyReader& reader() const { return reader_; }
+  ReplyReader& reader() { return reader_; }
 
  private:
   bool is_post() const { return verb_ == kPost; }
@@ -180,5 +181,7 @@ std::string Request::HeaderValue(std::string_view name) const {
 }
 
 const std::string& Request::body() const { return state_->reader().body(); }
+
+std::string Request::TakeBody() { return state_->reader().TakeBody(); }
 
 }  // namespace http

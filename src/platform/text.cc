@@ -9,6 +9,11 @@ constexpr char32_t kReplacement = 0xFFFD;
 
 bool IsContinuation(unsigned char c) { return (c & 0xC0) == 0x80; }
 
+// U+FFFD itself, sent as such, is valid.
+bool IsEncodedReplacement(std::string_view bytes, size_t from, size_t to) {
+  return bytes.substr(from, to - from) == "\xEF\xBF\xBD";
+}
+
 // Decodes one UTF-8 sequence at bytes[i]; advances i past what was consumed.
 // Overlong forms, surrogates and values past U+10FFFF decode as U+FFFD.
 char32_t DecodeOne(std::string_view bytes, size_t& i) {
@@ -54,6 +59,17 @@ std::wstring Utf8ToWide(std::string_view bytes) {
   std::wstring out;
   out.reserve(bytes.size());
   for (size_t i = 0; i < bytes.size();) out += static_cast<wchar_t>(DecodeOne(bytes, i));
+  return out;
+}
+
+std::string ValidUtf8(std::string bytes) {
+  size_t valid = 0;  // the bytes before it decode to themselves
+  for (size_t next = 0; valid < bytes.size(); valid = next) {
+    if (DecodeOne(bytes, next) == kReplacement && !IsEncodedReplacement(bytes, valid, next)) break;
+  }
+  if (valid == bytes.size()) return bytes;
+  std::string out(bytes, 0, valid);
+  for (size_t i = valid; i < bytes.size();) AppendUtf8(out, DecodeOne(bytes, i));
   return out;
 }
 

@@ -2,6 +2,8 @@
 
 #include <pugixml.hpp>
 
+#include <algorithm>
+
 #include "platform/text.h"
 
 namespace xml {
@@ -13,6 +15,27 @@ namespace {
 constexpr unsigned kParseOptions = pugi::parse_default | pugi::parse_comments |
                                    pugi::parse_pi | pugi::parse_declaration |
                                    pugi::parse_fragment;
+
+// pugixml's records on a 64-bit build: a node is eight words, an attribute five.
+constexpr std::size_t kNodeRecordBytes = 64;
+constexpr std::size_t kAttributeRecordBytes = 40;
+
+// An upper bound of the tree that parsing `text` makes. Every node but a text
+// starts with a '<' not followed by '/'; a text runs up to a '<' or the end;
+// every attribute holds a '='.
+std::size_t MostTreeBytes(std::string_view text) {
+  std::size_t marks = 0, closings = 0, equals = 0;
+  for (std::size_t i = 0; i < text.size(); ++i) {
+    if (text[i] == '<') {
+      ++marks;
+      if (i + 1 < text.size() && text[i + 1] == '/') ++closings;
+    } else if (text[i] == '=') {
+      ++equals;
+    }
+  }
+  const std::size_t nodes = (marks - closings) + (marks + 1);
+  return nodes * kNodeRecordBytes + equals * kAttributeRecordBytes;
+}
 
 std::wstring Wide(const char* utf8) { return text::Utf8ToWide(utf8); }
 
@@ -121,10 +144,17 @@ std::vector<Node> Node::Children() const {
 
 Document::Document() : document_(std::make_unique<pugi::xml_document>()) {}
 
-Document::Document(std::wstring_view text) : Document() {
-  text = text.substr(0, text.find(L'\0'));  // the reply text ends at its terminator
-  const pugi::xml_parse_result result = document_->load_buffer(
-      text.data(), text.size() * sizeof(wchar_t), kParseOptions, pugi::encoding_wchar);
+Document::Document(std::wstring_view text)
+    : Document(text::WideToUtf8(text.substr(0, text.find(L'\0')))) {}
+
+Document::Document(std::string utf8)
+    : text_(std::make_unique<std::string>(std::move(utf8))),
+      document_(std::make_unique<pugi::xml_document>()) {
+  std::string& text = *text_;
+  text.resize(std::min(text.size(), text.find('\0')));  // the reply text ends at its terminator
+  if (MostTreeBytes(text) > kMaxTreeBytes) return;
+  const pugi::xml_parse_result result = document_->load_buffer_inplace(
+      text.data(), text.size(), kParseOptions, pugi::encoding_utf8);
   if (!result || !IsWellFormedDocument(*document_)) document_->reset();
 }
 

@@ -4,6 +4,7 @@
 // declaration is skipped, never processed. Nothing here throws.
 #pragma once
 
+#include <cstddef>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -68,6 +69,10 @@ class Document {
   // Loads `text` up to its first NUL. Text that is not one well-formed element
   // (with comments and processing instructions around it) leaves the document empty.
   explicit Document(std::wstring_view text);
+  // The same for UTF-8 text, which the document keeps and reads in place, so
+  // that a large reply is never copied. Text that could make a tree of more
+  // than kMaxTreeBytes is refused unread and leaves the document empty too.
+  explicit Document(std::string utf8);
   ~Document();
   Document(Document&&) noexcept;
   Document& operator=(Document&&) noexcept;
@@ -80,7 +85,12 @@ class Document {
   Node Top() const;
 
  private:
+  std::unique_ptr<std::string> text_;  // the nodes' names and values point into it
   std::unique_ptr<pugi::xml_document> document_;
 };
+
+// The most memory a document's tree may take, beside its text: four times the
+// largest reply, so that reading one takes a few times its size at most.
+inline constexpr std::size_t kMaxTreeBytes = 64u << 20;
 
 }  // namespace xml

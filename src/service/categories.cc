@@ -3,7 +3,9 @@
 #include <Python.h>
 
 #include <string>
+#include <utility>
 
+#include "diag/trace.h"
 #include "platform/text.h"
 #include "platform/xml.h"
 #include "service/OBLoginData.h"
@@ -17,13 +19,25 @@ constexpr wchar_t kCategoryServlet[] = L"/servlet/getPresetCategory";
 constexpr wchar_t kCategoriesElement[] = L"categories";
 constexpr wchar_t kCategoryElement[] = L"category";
 constexpr char kCategoryIdAttribute[] = "categoryid";
+// Far more than the service has; what a hostile reply may add to the session's
+// map, which never shrinks.
+constexpr int kMostCategoriesPerReply = 10000;
 
-// Adds the reply's categories to the map, replacing the names of known ids.
+// Adds the reply's categories to the map, replacing the names of known ids;
+// past the bound the rest of the reply is ignored.
 void AddCategories(const xml::Document& reply, std::map<std::wstring, std::wstring>& categories) {
+  int taken = 0;
   for (const xml::Node& list : ChildrenNamed(reply.Top(), kCategoriesElement)) {
     for (const xml::Node& category : ChildrenNamed(list, kCategoryElement)) {
       const std::wstring id = category.Attribute(kCategoryIdAttribute);
-      if (!id.empty()) categories[id] = category.Text();
+      if (id.empty()) continue;
+      if (taken == kMostCategoriesPerReply) {
+        TraceMessage(L"GetPresetCategory: only the first %d categories of the reply are kept.",
+                     kMostCategoriesPerReply);
+        return;
+      }
+      categories[id] = category.Text();
+      ++taken;
     }
   }
 }
@@ -56,8 +70,8 @@ PyObject* OBLoginData::GetPresetCategory(const wchar_t* language) {
   const std::wstring path =
       QueryPath(kCategoryServlet, {{L"Locid", text::WideView(language)}, {L"Version", m_strVersion}});
   // A failed exchange adds nothing: the categories of earlier calls are returned.
-  if (const auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
-    AddCategories(xml::Document(*reply), m_mapCategory);
+  if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
+    AddCategories(xml::Document(std::move(*reply)), m_mapCategory);
   }
   FillDictionary(dictionary, m_mapCategory);
   return dictionary;

@@ -1,6 +1,8 @@
 // Server discovery: the service information from the detection host, asked for
 // once per session, with the staging host as the fallback server host.
+#include <algorithm>
 #include <string>
+#include <string_view>
 
 #include "diag/trace.h"
 #include "platform/text.h"
@@ -20,7 +22,20 @@ struct InfoField {
   std::wstring OBLoginData::*member;
   const wchar_t* storedLine;  // with the new value; null for none
   const wchar_t* failedLine;  // when the query fails; null for none
+  bool (*acceptable)(std::wstring_view value) = nullptr;  // null: any value is stored
+  const wchar_t* refusedLine = nullptr;                   // with the refused value
 };
+
+bool IsHostNameCharacter(wchar_t c) {
+  return (c >= L'a' && c <= L'z') || (c >= L'A' && c <= L'Z') || (c >= L'0' && c <= L'9') ||
+         c == L'-' || c == L'.';
+}
+
+// The server host is spliced into every later URL: a port, a path, a user or a
+// query in it would send those requests, the sign-in password among them, elsewhere.
+bool IsBareHostName(std::wstring_view value) {
+  return !value.empty() && std::all_of(value.begin(), value.end(), IsHostNameCharacter);
+}
 
 }  // namespace
 
@@ -56,13 +71,14 @@ void OBLoginData::DetectServerInfo() {
     request.path += L"&versionType=" + service::EscapePathValue(m_strVersionType);
   }
   request.read = service::ReplyRead::kByLength;
-  const std::optional<std::string> reply = service::RunExchange(request);
-  if (reply) StoreServiceInfo(xml::Document(service::DecodeAnsiReply(*reply)));
+  std::optional<std::string> reply = service::RunExchange(request);
+  if (reply) StoreServiceInfo(xml::Document(service::DecodeAnsiReply(std::move(*reply))));
 }
 
 void OBLoginData::StoreServiceInfo(const xml::Document& reply) {
   const InfoField fields[] = {
-      {"INFO/APIUrl", &OBLoginData::m_strServerUrl, nullptr, nullptr},
+      {"INFO/APIUrl", &OBLoginData::m_strServerUrl, nullptr, nullptr, IsBareHostName,
+       L"Update OBInfo fail: APIUrl is not a host name: %s"},
       {"INFO/AdjustmentPreset", &OBLoginData::m_strAdjustmentPresetURL, nullptr, nullptr},
       {"INFO/SignUp", &OBLoginData::m_strSignUpURL, L"KRV SignUp = %s",
        L"Update OBInfo fail: Can not parse SignUp from xml."},
@@ -77,6 +93,10 @@ void OBLoginData::StoreServiceInfo(const xml::Document& reply) {
     const xml::Lookup node = reply.NodeText(field.path);
     if (node.failed() && field.failedLine) TraceMessage(field.failedLine);
     if (!node.found()) continue;
+    if (field.acceptable && !field.acceptable(node.text)) {
+      TraceMessage(field.refusedLine, node.text.c_str());
+      continue;
+    }
     this->*field.member = node.text;
     if (field.storedLine) TraceMessage(field.storedLine, (this->*field.member).c_str());
   }

@@ -2,6 +2,7 @@
 #include <Python.h>
 
 #include <string>
+#include <utility>
 
 #include "platform/xml.h"
 #include "service/OBLoginData.h"
@@ -34,8 +35,8 @@ PyObject* OBLoginData::GetEffectByGUID(const wchar_t* guid) {
   EnsureServerUrl();
   const std::wstring path = QueryPath(kEffectServlet, {{L"token", token}, {L"guid", guid}});
   std::wstring address;
-  if (const auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
-    address = EffectAddress(xml::Document(*reply));
+  if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
+    address = EffectAddress(xml::Document(std::move(*reply)));
   }
   return NewUnicodeResult(UnescapeUrl(address));
 }

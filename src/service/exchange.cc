@@ -1,6 +1,8 @@
 #include "service/exchange.h"
 
+#include <algorithm>
 #include <new>
+#include <utility>
 
 #include "platform/http.h"
 #include "platform/text.h"
@@ -29,9 +31,7 @@ bool SendRequest(http::Request& request, const ServiceRequest& what) {
 // The service's three readings differ only in how much of a body that WinInet
 // had not yet received they would see. libcurl hands over the body framed by its
 // announced length, its chunks or the connection's end, so each takes it whole.
-std::string ReadReply(const http::Request& request, ReplyRead) { return request.body(); }
-
-std::string_view UpToZero(std::string_view bytes) { return bytes.substr(0, bytes.find('\0')); }
+std::string ReadReply(http::Request& request, ReplyRead) { return request.TakeBody(); }
 
 bool MayNotStandInTarget(unsigned char byte) {
   return byte < kFirstPrintable || byte >= kDelete || byte == kFragmentMark;
@@ -52,11 +52,12 @@ std::optional<std::string> RunExchange(const ServiceRequest& what) {
   }
 }
 
-std::wstring DecodeUtf8Reply(std::string_view bytes) {
-  return text::Utf8ToWide(UpToZero(bytes));
+std::string DecodeUtf8Reply(std::string bytes) {
+  bytes.resize(std::min(bytes.size(), bytes.find('\0')));
+  return text::ValidUtf8(std::move(bytes));
 }
 
-std::wstring DecodeAnsiReply(std::string_view bytes) { return DecodeUtf8Reply(bytes); }
+std::string DecodeAnsiReply(std::string bytes) { return DecodeUtf8Reply(std::move(bytes)); }
 
 std::wstring EscapePathValue(std::wstring_view value) {
   return PercentEncode(text::WideToUtf8(value), MayNotStandInTarget, kUpperHexDigits);

@@ -37,10 +37,12 @@ struct ServiceRequest {
 // http::kMaxReplyBytes included).
 std::optional<std::string> RunExchange(const ServiceRequest& request);
 
-// The reply bytes up to the first zero byte, as text for the XML reader.
-std::wstring DecodeUtf8Reply(std::string_view bytes);
+// The reply bytes up to the first zero byte, as UTF-8 text for the XML reader
+// (undecodable bytes become U+FFFD). The text stays narrow: a wide copy of a
+// large reply would take four times its size.
+std::string DecodeUtf8Reply(std::string bytes);
 // The same for replies in the thread's ANSI code page, which is UTF-8 here.
-std::wstring DecodeAnsiReply(std::string_view bytes);
+std::string DecodeAnsiReply(std::string bytes);
 
 // A query value made fit to stand in a request target: its UTF-8 bytes that may
 // not (controls, space, DEL, non-ASCII) and "#", which would end the target, are

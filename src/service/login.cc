@@ -60,13 +60,13 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
   request.body = SignInBody(EscapeFormValue(account), EscapeFormValue(password), m_strVersion,
                             m_strVersionType, m_strUuid);
   request.read = service::ReplyRead::kByLength;
-  const std::optional<std::string> reply = service::RunExchange(request);
+  std::optional<std::string> reply = service::RunExchange(request);
   if (!reply) return 0;
 
   std::wstring token;
   bool firstLogin = false;
   const unsigned int result =
-      ReadSignInReply(xml::Document(service::DecodeUtf8Reply(*reply)), token, firstLogin);
+      ReadSignInReply(xml::Document(service::DecodeUtf8Reply(std::move(*reply))), token, firstLogin);
   if (firstLogin) return 0;
   if (result == 1) {
     m_bLoggedIn = 1;

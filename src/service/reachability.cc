@@ -16,18 +16,19 @@ constexpr char kProbeAgent[] = "Microsoft Internet Explorer";
 constexpr auto kWaitStep = std::chrono::milliseconds(500);
 constexpr int kMostWaits = 11;  // 5.5 s in all
 
-// Both threads take handles out of the members; the atomic exchange hands each
-// handle to exactly one of them, so each is closed exactly once.
-HINTERNET TakeHandle(HINTERNET& member) {
-  return __atomic_exchange_n(&member, nullptr, __ATOMIC_ACQ_REL);
-}
+// The members only show the probe's handles: Python can write any value into
+// them through their setters, so a value read back from a member is never
+// closed. The probe's own handles are closed through the probe (each closes
+// once, whichever thread comes first); the members are only cleared.
+void ClearHandle(HINTERNET& member) { __atomic_store_n(&member, nullptr, __ATOMIC_RELEASE); }
 
 void PutHandle(HINTERNET& member, http::ProbeHandle& handle) {
   __atomic_store_n(&member, static_cast<HINTERNET>(&handle), __ATOMIC_RELEASE);
 }
 
-void CloseHandle(HINTERNET handle) {
-  if (handle) static_cast<http::ProbeHandle*>(handle)->Close();
+void CloseHandle(HINTERNET& member, http::ProbeHandle& handle) {
+  ClearHandle(member);
+  handle.Close();
 }
 
 bool WaitForProbe(const std::future<void>& probe) {
@@ -56,8 +57,8 @@ BOOL OBLoginData::CheckServerReachable(const char* url) {
     return m_bServerReachable;  // no thread: nothing to wait for
   }
   if (!WaitForProbe(finished)) {
-    CloseHandle(TakeHandle(m_hConnect));
-    CloseHandle(TakeHandle(m_hInternet));
+    CloseHandle(m_hConnect, probe.connection());
+    CloseHandle(m_hInternet, probe.session());
   }
   finished.wait();
   return m_bServerReachable;
@@ -65,14 +66,14 @@ BOOL OBLoginData::CheckServerReachable(const char* url) {
 
 void OBLoginData::ProbeThreadProc(http::Probe& probe) {
   m_bServerReachable = 0;
-  TakeHandle(m_hInternet);
-  TakeHandle(m_hConnect);
+  ClearHandle(m_hInternet);
+  ClearHandle(m_hConnect);
   PutHandle(m_hInternet, probe.session());
   const std::string url(m_szChkServerUrl, ::strnlen(m_szChkServerUrl, kMaxPath));
   if (probe.Open(url)) {
     PutHandle(m_hConnect, probe.connection());
     m_bServerReachable = 1;
-    CloseHandle(TakeHandle(m_hConnect));
+    CloseHandle(m_hConnect, probe.connection());
   }
-  CloseHandle(TakeHandle(m_hInternet));
+  CloseHandle(m_hInternet, probe.session());
 }

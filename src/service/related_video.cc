@@ -22,9 +22,9 @@ constexpr char kVideoUrlPath[] = "info/videoUrl";
 
 // The text of the reply's node at `path`; nothing for an empty reply, a reply that
 // is not XML or one without the node.
-std::optional<std::wstring> ReplyField(const std::optional<std::wstring>& reply, const char* path) {
+std::optional<std::wstring> ReplyField(std::optional<std::string> reply, const char* path) {
   if (!reply || reply->empty()) return std::nullopt;
-  xml::Lookup field = xml::Document(*reply).NodeText(path);
+  xml::Lookup field = xml::Document(std::move(*reply)).NodeText(path);
   if (!field.found()) return std::nullopt;
   return std::move(field.text);
 }

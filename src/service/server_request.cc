@@ -13,13 +13,14 @@ std::wstring QueryPath(std::wstring_view servlet, std::initializer_list<QueryFie
   return path;
 }
 
-std::optional<std::wstring> PostToServer(const std::wstring& host, const std::wstring& path,
-                                         service::ReplyRead read, ReplyCoding coding) {
+std::optional<std::string> PostToServer(const std::wstring& host, const std::wstring& path,
+                                        service::ReplyRead read, ReplyCoding coding) {
   service::ServiceRequest request;
   request.host = host;
   request.path = path;
   request.read = read;
-  const std::optional<std::string> reply = service::RunExchange(request);
+  std::optional<std::string> reply = service::RunExchange(request);
   if (!reply) return std::nullopt;
-  return coding == ReplyCoding::kUtf8 ? service::DecodeUtf8Reply(*reply) : service::DecodeAnsiReply(*reply);
+  return coding == ReplyCoding::kUtf8 ? service::DecodeUtf8Reply(std::move(*reply))
+                                      : service::DecodeAnsiReply(std::move(*reply));
 }

@@ -20,6 +20,6 @@ using QueryField = std::pair<const wchar_t*, std::wstring_view>;
 // target; the path is built whole, whatever its length.
 std::wstring QueryPath(std::wstring_view servlet, std::initializer_list<QueryField> fields);
 
-// The reply text, whatever the HTTP status; nothing when the exchange failed.
-std::optional<std::wstring> PostToServer(const std::wstring& host, const std::wstring& path,
+// The reply text (UTF-8), whatever the HTTP status; nothing when the exchange failed.
+std::optional<std::string> PostToServer(const std::wstring& host, const std::wstring& path,
                                          service::ReplyRead read, ReplyCoding coding);

@@ -202,7 +202,7 @@ void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
 // Keeps the decoded URL of the published preset; returns the server's error
 // text, whole.
 std::wstring PyPresetUploader::ReadReply(const std::string& reply) {
-  const xml::Document document(text::Utf8ToWide(reply));
+  const xml::Document document(text::ValidUtf8(reply));
   const xml::Lookup url = document.NodeText(kUrlNode);
   if (url.found()) uploadedUrl = UnescapeUrl(url.text);
   const xml::Lookup error = document.NodeText(kErrorNode);

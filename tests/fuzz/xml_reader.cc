@@ -105,7 +105,7 @@ extern "C" int LLVMFuzzerInitialize(int*, char***) {
 }
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
-  const xml::Document document(service::DecodeUtf8Reply(fuzz::Bytes(data, size)));
+  const xml::Document document(service::DecodeUtf8Reply(std::string(fuzz::Bytes(data, size))));
   for (const char* path : kPaths) document.NodeText(path);
   document.Top().Text();
   Walk(document, document.Top(), "", 0);

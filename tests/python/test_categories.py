@@ -89,6 +89,15 @@ class Replies(CategoryTest):
         self.assertEqual(result, {u'-2': u'Negative'})
         self.assertEqual(self.name_of(-2), (1, u'Negative'))
 
+    def test_one_reply_adds_at_most_ten_thousand_categories(self):
+        listed = u''.join(u'<category categoryid="%d">C%d</category>' % (i, i)
+                          for i in range(10005))
+        result = self.categories(u'<categories>%s</categories>' % listed)
+        self.assertEqual(len(result), 10000)
+        self.assertEqual((result[u'0'], result[u'9999']), (u'C0', u'C9999'))
+        self.assertEqual(self.trace_lines(),
+                         [u'GetPresetCategory: only the first 10000 categories of the reply are kept.'])
+
     def test_a_reply_that_is_not_the_expected_xml_adds_nothing(self):
         self.categories(FIRST)
         for reply in (u'<categories><category categoryid="1">cut', u'<other/>', u''):

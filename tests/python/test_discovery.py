@@ -1,11 +1,14 @@
 """Server discovery against the reference service: the detection request, the
 six fields of the service information, the staging fallback, the reachability
 probe in front of it, and the interpreter lock released while it all runs."""
+import ctypes
 import os
+import threading
 import time
 import unittest
 
 import _PyUploader as native
+from binding_support import address_of
 from refservice import DEFAULT_HOST, DETECTION_HOST, SERVER_HOST, STAGING_HOST, reply, xml_reply
 from service_session import PROBE_LIMIT, UUID, SessionTest, Ticker, info_xml
 
@@ -82,6 +85,19 @@ class ServiceInformation(DiscoveryTest):
                          u'http://%shttp://%s/forgetpwd&uuid=%s'
                          % (SERVER_HOST, DEFAULT_HOST, UUID))
 
+    def test_a_server_host_that_is_not_a_bare_host_name_is_refused(self):
+        refused = [u'api.orbishare.com:8080/evil?x=', u'user@api.orbishare.com',
+                   u'api.orbishare.com/path', u'api orbishare', u'api.orbishare.com?q', u'',
+                   u'\xe4pi.test']
+        for value in refused:
+            self.svc.reset()
+            self.call('LogoutOrbishare')
+            self.clear_trace()
+            self.answer_detection(xml_reply(info_xml(APIUrl=value.encode('utf-8'))))
+            self.assertEqual(self.discover(), unicode(STAGING_HOST), value)
+            self.assertEqual(self.trace_lines(), [
+                u'Update OBInfo fail: APIUrl is not a host name: ' + value] + FALLBACK_LINES)
+
     def test_a_root_spelled_info_yields_nothing(self):
         self.answer_detection(xml_reply(info_xml('info', **SIX_FIELDS)))
         self.assertEqual(self.discover(), unicode(STAGING_HOST))
@@ -157,6 +173,32 @@ class Reachability(DiscoveryTest):
         self.assertEqual(self.discover(), unicode(STAGING_HOST))
         self.assertEqual(native.OBLoginData_m_szChkServerUrl_get(self.session), '')
         self.assertEqual(self.svc.requests(), [])
+
+    def test_values_written_from_python_into_the_handles_are_never_closed(self):
+        # Answered while it waits, the probe closes its handles itself; silent,
+        # the waiting thread closes them: neither may close a foreign value.
+        cells = [getattr(native, 'OBLoginData_%s_get' % member)(self.session)
+                 for member in ('m_hInternet', 'm_hConnect')]
+        for cell in cells:
+            ctypes.c_void_p.from_address(address_of(cell)).value = 0x1000
+        stop = threading.Event()
+
+        def overwrite():
+            while not stop.is_set():
+                native.OBLoginData_m_hInternet_set(self.session, cells[0])
+                native.OBLoginData_m_hConnect_set(self.session, cells[1])
+                time.sleep(0.001)
+        for delay, host in ((1, SERVER_HOST), (6, STAGING_HOST)):
+            self.call('LogoutOrbishare')
+            self.svc.script(DETECTION_HOST, '/', [reply(delay=delay)])
+            writer = threading.Thread(target=overwrite)
+            writer.start()
+            try:
+                self.assertEqual(self.discover(), unicode(host))
+            finally:
+                stop.set()
+                writer.join()
+                stop.clear()
 
     def test_a_silent_host_is_given_up_after_the_last_wait(self):
         self.svc.script(DETECTION_HOST, '/', [reply(delay=6)])

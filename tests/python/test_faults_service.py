@@ -6,6 +6,7 @@ its failure result or the exact text, within its bound, and keeps no
 descriptor or thread."""
 import base64
 import os
+import re
 import time
 import unittest
 
@@ -46,6 +47,9 @@ class Operation(object):
         self.signed_in, self.replies_before = signed_in, replies_before
 
 
+HOST_NAME = re.compile(r'[A-Za-z0-9.-]+\Z')  # only a bare host name is kept as the server
+
+
 def call(name, *args):
     return lambda test: getattr(native, 'OBLoginData_' + name)(test.session, *args)
 
@@ -61,7 +65,8 @@ def sign_in(test):
 
 OPERATIONS = [
     Operation('discovery', DETECTION_HOST, '/observer.jsp', '<INFO><APIUrl>%s</APIUrl></INFO>',
-              discover, unicode(STAGING_HOST)),
+              discover, unicode(STAGING_HOST),
+              lambda text: text if HOST_NAME.match(text) else unicode(STAGING_HOST)),
     Operation('sign-in', SERVER_HOST, '/servlet/memLogin', '<info><tokenid>%s</tokenid></info>',
               sign_in, (0, u''), lambda text: (1, text)),
     Operation('categories', SERVER_HOST, '/servlet/getPresetCategory',

@@ -2,15 +2,34 @@
 destroyed while its worker runs. The service reads slowly so that the upload
 is still streaming when the test acts."""
 import gc
+import subprocess
 import sys
+import time
 import unittest
 
-from upload_support import (Reports, UploadTest, pump, wait_for_completion,
+from refservice import wait_until
+from upload_support import (TEXTS, Reports, UploadTest, pump, wait_for_completion,
                             wait_for_progress, worker_threads)
 
 LARGE_PRESET = 24 * 1024 * 1024
 SLOW_READ = 1024 * 1024  # bytes per second
 QUIET_AFTER = 1.0  # seconds in which no further report may arrive
+EXIT_BOUND = 10  # seconds for an interpreter to exit mid-upload
+# A fresh interpreter that starts the upload and exits while the preset streams,
+# the uploader in a global (destroyed as the module's globals are cleared) or in
+# a reference cycle (never collected: its worker still runs when the process ends).
+EXIT_MID_UPLOAD = '''
+from upload_support import Reports, new_uploader, wait_for_progress
+reports = Reports()
+uploader = new_uploader()
+uploader.SetCallback(reports)
+uploader.StartUpload(%r, %r, *%r)
+wait_for_progress(reports)
+if %r:
+    cycle = [uploader, None]
+    cycle[1] = cycle
+    del uploader
+'''
 
 
 class SlowUpload(UploadTest):
@@ -50,6 +69,25 @@ class CancelledUpload(SlowUpload):
         self.uploader.CancelUpload()
         self.assertEqual(wait_for_completion(second)[2:], (100, 0, u'', u''))
         self.assertEqual(self.uploader.GetUploadedFileUrl(), u'')
+
+
+class InterpreterExit(SlowUpload):
+
+    def test_the_interpreter_exits_mid_upload_at_once_and_the_upload_is_cut_off(self):
+        texts = [TEXTS[name] for name in ('templateKey', 'title', 'category', 'tags', 'description')]
+        for in_cycle in (False, True):
+            self.svc.reset()
+            self.slow_reader(SLOW_READ)
+            code = EXIT_MID_UPLOAD % (self.files.preset, self.files.images, texts, in_cycle)
+            started = time.time()
+            child = subprocess.Popen(['timeout', str(EXIT_BOUND), sys.executable, '-c', code],
+                                     stdout=subprocess.PIPE, stderr=subprocess.STDOUT)
+            output = child.communicate()[0]
+            self.assertEqual(child.returncode, 0, (in_cycle, output))
+            self.assertLess(time.time() - started, EXIT_BOUND / 2.0, in_cycle)
+            [upload] = wait_until(lambda: [u for u in self.uploads() if u.error or u.complete],
+                                  10.0, 'the upload connection ended')
+            self.assertFalse(upload.complete, in_cycle)
 
 
 class DestroyedUploader(SlowUpload):

@@ -35,5 +35,8 @@ class Listener(object):
                 sock, _ = self._sock.accept()
             except OSError:
                 return
+            # A reply goes out in several writes; without this, each write after
+            # the first waits for the client's delayed acknowledgement (40 ms).
+            sock.setsockopt(socket.IPPROTO_TCP, socket.TCP_NODELAY, 1)
             self._service.connection_accepted(sock, self._host, self._address,
                                               self._port, self._tls)

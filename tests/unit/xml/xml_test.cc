@@ -118,4 +118,24 @@ TEST(EmptyDocument, HasNoChildrenAndFindsNothing) {
   EXPECT_FALSE(xml::Document(L"<a/>").empty());
 }
 
+TEST(ReadInPlace, AMovedDocumentStillReadsItsText) {
+  xml::Document first(std::string("<a>x</a>"));  // short enough to live inside a string object
+  const xml::Document moved(std::move(first));
+  first = xml::Document(std::string("<b>y</b>"));  // takes the first one's place
+  EXPECT_EQ(moved.NodeText("a").text, L"x");
+}
+
+TEST(TreeBound, TextThatCouldMakeATreeTooLargeIsRefusedUnread) {
+  const auto elements = [](std::size_t count) {
+    std::string text = "<a>";
+    for (std::size_t i = 0; i < count; ++i) text += "<b/>";
+    return xml::Document(text + "</a>");
+  };
+  // A node record takes 64 bytes: a quarter of the bound's count is read, the
+  // whole count is not.
+  const std::size_t records = xml::kMaxTreeBytes / 64;
+  EXPECT_FALSE(elements(records / 4).empty());
+  EXPECT_TRUE(elements(records).empty());
+}
+
 }  // namespace

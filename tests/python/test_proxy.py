@@ -1,0 +1,136 @@
+"""A real HTTP proxy (tinyproxy, started inside the sandbox): with http_proxy and
+https_proxy set, discovery, categories and the upload go through it, sign-in
+tunnels through CONNECT with the certificate still verified, and no_proxy
+bypasses it. The proxy's log and the Via header it adds show what went through."""
+import os
+import re
+import shutil
+import socket
+import subprocess
+import tempfile
+import unittest
+
+import _PyUploader as native
+from refservice import DETECTION_HOST, SERVER_HOST, wait_until
+from upload_support import UPLOAD_PATH, UploadTest, wait_for_completion
+
+PROXY_PORT = 8888
+PROXY_URL = 'http://127.0.0.1:%d' % PROXY_PORT
+VIA_NAME = 'testproxy'
+CONFIG = '''User nobody
+Group nogroup
+Listen 127.0.0.1
+Port %d
+Timeout 60
+LogFile "%s"
+LogLevel Info
+Allow 127.0.0.1
+ViaProxyName "%s"
+ConnectPort 443
+'''
+LOGGED_REQUEST = re.compile(r'Request \(file descriptor \d+\): (\S+) (\S+) HTTP/')
+CATEGORIES = '/servlet/getPresetCategory'
+SIGN_IN = '/servlet/memLogin'
+
+
+def proxy_accepts():
+    try:
+        socket.create_connection(('127.0.0.1', PROXY_PORT), 1).close()
+        return True
+    except socket.error:
+        return False
+
+
+class ProxyTest(UploadTest):
+
+    @classmethod
+    def setUpClass(cls):
+        cls.folder = tempfile.mkdtemp(prefix='proxy-')
+        os.chmod(cls.folder, 0o777)  # the proxy writes its log as nobody
+        cls.log = os.path.join(cls.folder, 'proxy.log')
+        config = os.path.join(cls.folder, 'tinyproxy.conf')
+        with open(config, 'w') as out:
+            out.write(CONFIG % (PROXY_PORT, cls.log, VIA_NAME))
+        cls.proxy = subprocess.Popen(['tinyproxy', '-d', '-c', config],
+                                     stdout=open(os.devnull, 'w'), stderr=subprocess.STDOUT)
+        wait_until(proxy_accepts, 10.0, 'proxy accepting connections')
+
+    @classmethod
+    def tearDownClass(cls):
+        cls.proxy.terminate()
+        cls.proxy.wait()
+        shutil.rmtree(cls.folder, ignore_errors=True)
+
+    def setUp(self):
+        UploadTest.setUp(self)
+        self.saved_environment = dict(os.environ)
+        os.environ.update(http_proxy=PROXY_URL, https_proxy=PROXY_URL)
+        self.session = native.new_OBLoginData(u'5.0', u'Retail', u'machine-1')
+        self.logged_before = len(self.proxied())
+
+    def tearDown(self):
+        native.delete_OBLoginData(self.session)
+        os.environ.clear()
+        os.environ.update(self.saved_environment)
+        UploadTest.tearDown(self)
+
+    def call(self, operation, *args):
+        return getattr(native, 'OBLoginData_' + operation)(self.session, *args)
+
+    def proxied(self):
+        """(method, target) of every request the proxy logged, in order."""
+        with open(self.log) as log:
+            return LOGGED_REQUEST.findall(log.read())
+
+    def proxied_now(self):
+        return self.proxied()[self.logged_before:]
+
+    def via(self, host, path):
+        return [request.header('Via') for request in self.svc.requests(host=host, path=path)]
+
+
+class ThroughTheProxy(ProxyTest):
+
+    def test_discovery_categories_and_the_upload_go_through_it(self):
+        self.call('InitOBServerURL')
+        self.assertEqual(self.call('GetServerUrl'), unicode(SERVER_HOST))
+        self.call('GetPresetCategory', u'ENU')
+        self.assertEqual(self.start(), 1)
+        self.assertEqual(wait_for_completion(self.reports)[3], 1)
+        methods = [(method, target.split('?')[0]) for method, target in self.proxied_now()]
+        self.assertEqual(methods, [
+            ('GET', 'http://%s/' % DETECTION_HOST),
+            ('GET', 'http://%s/observer.jsp' % DETECTION_HOST),
+            ('POST', 'http://%s%s' % (SERVER_HOST, CATEGORIES)),
+            ('POST', 'http://%s%s' % (SERVER_HOST, UPLOAD_PATH))])
+        [upload] = self.uploads()
+        self.assertEqual(upload.complete, True)
+        for host, path in ((DETECTION_HOST, '/observer.jsp'), (SERVER_HOST, CATEGORIES),
+                           (SERVER_HOST, UPLOAD_PATH)):
+            [via] = self.via(host, path)
+            self.assertTrue(via.startswith('1.1 ' + VIA_NAME), (path, via))
+
+    def test_sign_in_tunnels_and_a_wrong_certificate_is_still_refused(self):
+        self.call('SetOBURLAsReg', unicode(SERVER_HOST))
+        self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
+        self.assertIn(('CONNECT', '%s:443' % SERVER_HOST), self.proxied_now())
+        [sign_in] = self.svc.requests(host=SERVER_HOST, path=SIGN_IN)
+        self.assertEqual((sign_in.tls, sign_in.header('Via')), (True, None))  # opaque tunnel
+        self.svc.reset()
+        self.svc.tls('wrong-name')
+        self.call('LogoutOrbishare')
+        self.call('SetOBURLAsReg', unicode(SERVER_HOST))
+        self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 0)
+        self.assertEqual(self.svc.requests(host=SERVER_HOST, path=SIGN_IN), [])
+
+    def test_no_proxy_bypasses_it(self):
+        os.environ['no_proxy'] = 'orbishare.com'
+        self.call('InitOBServerURL')
+        self.call('GetPresetCategory', u'ENU')
+        self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
+        self.assertEqual(self.proxied_now(), [])
+        self.assertEqual(self.via(SERVER_HOST, CATEGORIES), [None])
+
+
+if __name__ == '__main__':
+    unittest.main()
