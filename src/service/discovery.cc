@@ -25,6 +25,9 @@ struct InfoField {
 }  // namespace
 
 void OBLoginData::InitOBServerURL() {
+  // Ends last: after every use of the session, with the lock taken back.
+  const OperationGate::Pass running(m_runningOperations);
+  if (!running) return;
   AllowThreadsGuard unlocked;
   EnsureServerUrl();
 }
