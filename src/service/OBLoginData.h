@@ -32,7 +32,8 @@ class OBLoginData {
   // Null arguments are taken as empty texts.
   OBLoginData(const wchar_t* version, const wchar_t* versionType, const wchar_t* uuid);
   // Sends nothing to the service. An operation that runs with the interpreter
-  // lock released on another thread is waited for (with the lock released).
+  // lock released on another thread is waited for (with the lock released);
+  // sign-in and discovery begun meanwhile do nothing (sign-in returns 0).
   ~OBLoginData();
   OBLoginData(const OBLoginData&) = delete;
   OBLoginData& operator=(const OBLoginData&) = delete;
