@@ -19,8 +19,8 @@ struct ClassData {
 
 // Builds the class's ClassData and attaches it to `type` and, recursively, to every
 // type in its cast list that has no converter and no class yet. Registering again
-// replaces the previous ClassData everywhere it was attached and, when this module
-// made it, frees it (class data of another module is left to that module).
+// replaces the previous ClassData wherever it was attached; one that this module
+// made is freed once no type holds it (another module's is left to that module).
 void RegisterClass(TypeInfo& type, PyObject* cls);
 
 // A new instance of the registered class holding `pointerObject` as "this"; null
