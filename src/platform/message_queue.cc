@@ -34,14 +34,19 @@ void MessageQueue::Post(Window& window, std::uint32_t message, std::uintptr_t wp
   if (wake) wake();
 }
 
+// A window destroyed by its own procedure is not waited for: that dispatch
+// runs on the owner, below this call.
 void MessageQueue::DropMessagesFor(const Window& window) {
   std::deque<Entry> dropped;
   {
-    std::lock_guard<std::mutex> lock(lock_);
+    std::unique_lock<std::mutex> lock(lock_);
     const auto kept = std::stable_partition(entries_.begin(), entries_.end(),
                                             [&](const Entry& e) { return e.window != &window; });
     std::move(kept, entries_.end(), std::back_inserter(dropped));
     entries_.erase(kept, entries_.end());
+    if (std::this_thread::get_id() != owner_) {
+      dispatchEnded_.wait(lock, [&] { return !Dispatching(window); });
+    }
   }
   Drop(dropped);  // outside the lock: a payload's destructor may post
 }
@@ -54,7 +59,18 @@ bool MessageQueue::TakeNext(Entry& entry) {
   }
   entry = entries_.front();
   entries_.pop_front();
+  dispatching_.push_back(entry.window);
   return true;
+}
+
+void MessageQueue::EndDispatch() {
+  std::lock_guard<std::mutex> lock(lock_);
+  dispatching_.pop_back();
+  dispatchEnded_.notify_all();
+}
+
+bool MessageQueue::Dispatching(const Window& window) const {
+  return std::find(dispatching_.begin(), dispatching_.end(), &window) != dispatching_.end();
 }
 
 // The procedure may destroy its window, or post again: nothing here touches the
@@ -64,6 +80,7 @@ std::size_t MessageQueue::Drain() {
   Entry entry;
   while (TakeNext(entry)) {
     entry.window->Dispatch(entry.message, entry.wparam, entry.lparam);
+    EndDispatch();
     ++dispatched;
   }
   return dispatched;

@@ -9,11 +9,14 @@
 // chooses to (tests call DispatchPending directly).
 #pragma once
 
+#include <condition_variable>
 #include <cstddef>
 #include <cstdint>
 #include <deque>
 #include <memory>
 #include <mutex>
+#include <thread>
+#include <vector>
 
 #include "platform/window.h"
 
@@ -53,15 +56,23 @@ class MessageQueue {
 
   void Post(Window& window, std::uint32_t message, std::uintptr_t wparam, std::intptr_t lparam,
             PayloadDeleter dropPayload);
+  // Drops the window's queued messages. On another thread than the owner it
+  // also waits for a dispatch to the window that is under way.
   void DropMessagesFor(const Window& window);
   bool TakeNext(Entry& entry);
+  void EndDispatch();
+  bool Dispatching(const Window& window) const;
   std::size_t Drain();
   static void Drop(std::deque<Entry>& entries);
 
+  const std::thread::id owner_ = std::this_thread::get_id();
   std::mutex lock_;
   std::deque<Entry> entries_;     // guarded by lock_
   bool drainScheduled_ = false;   // guarded by lock_
   WakeHandler wake_ = nullptr;    // guarded by lock_
+  // The windows whose procedures run now, innermost last; guarded by lock_.
+  std::vector<const Window*> dispatching_;
+  std::condition_variable dispatchEnded_;
 };
 
 }  // namespace ui

@@ -36,8 +36,9 @@ class Window {
   // class is not registered.
   static std::unique_ptr<Window> Create(const std::wstring& className);
 
-  // Runs on the owning thread. Messages still queued for the window are never
-  // dispatched; their payloads are freed.
+  // Messages still queued for the window are never dispatched; their payloads
+  // are freed. On another thread than the owner, a dispatch to the window that
+  // is under way is waited for first.
   ~Window();
   Window(const Window&) = delete;
   Window& operator=(const Window&) = delete;

@@ -32,7 +32,7 @@ OBLoginData::OBLoginData(const wchar_t* version, const wchar_t* versionType, con
   TraceMessage(L"KRV versionType = %s", m_strVersionType.c_str());
 }
 
-OBLoginData::~OBLoginData() = default;
+OBLoginData::~OBLoginData() { m_runningOperations.Close(); }
 
 PyObject* OBLoginData::GetUserName() const { return NewUnicodeResult(m_strUserName); }
 

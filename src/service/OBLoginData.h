@@ -10,6 +10,7 @@
 #include <string>
 
 #include "service/ServiceHosts.h"
+#include "upload/OperationGate.h"
 
 struct _object;
 typedef struct _object PyObject;
@@ -30,7 +31,10 @@ class OBLoginData {
  public:
   // Null arguments are taken as empty texts.
   OBLoginData(const wchar_t* version, const wchar_t* versionType, const wchar_t* uuid);
-  ~OBLoginData();  // sends nothing to the service
+  // Sends nothing to the service. An operation that runs with the interpreter
+  // lock released on another thread is waited for (with the lock released);
+  // sign-in and discovery begun meanwhile do nothing (sign-in returns 0).
+  ~OBLoginData();
   OBLoginData(const OBLoginData&) = delete;
   OBLoginData& operator=(const OBLoginData&) = delete;
 
@@ -106,4 +110,7 @@ class OBLoginData {
   std::map<std::wstring, std::wstring> m_mapCategory;  // decimal category id to name
   mutable std::mutex m_csToken;
   const ServiceHosts m_hosts;
+  // Passed by the operations that release the interpreter lock, during which
+  // another Python thread may delete the session.
+  OperationGate m_runningOperations;
 };

@@ -40,6 +40,9 @@ bool IsBareHostName(std::wstring_view value) {
 }  // namespace
 
 void OBLoginData::InitOBServerURL() {
+  // Ends last: after every use of the session, with the lock taken back.
+  const OperationGate::Pass running(m_runningOperations);
+  if (!running) return;
   AllowThreadsGuard unlocked;
   EnsureServerUrl();
 }

@@ -44,6 +44,9 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
     m_bLoggedIn = 0;
     return 0;
   }
+  // Ends last: after every use of the session, with the lock taken back.
+  const OperationGate::Pass running(m_runningOperations);
+  if (!running) return 0;
   AllowThreadsGuard unlocked;
   EnsureServerUrl();
   const std::string probeUrl = "http://" + text::WideToUtf8(m_hosts.defaultHost);

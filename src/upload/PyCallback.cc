@@ -28,6 +28,7 @@ void PyCallback::Call(const char* format, ...) {
 }
 
 PyObject* PyCallback::CallV(const char* format, std::va_list args) {
+  if (callback == nullptr) return nullptr;
   PyObject* arguments = nullptr;
   if (format != nullptr && *format != '\0') {
     // A single item would build a bare value; the callable always gets a tuple.
@@ -40,8 +41,13 @@ PyObject* PyCallback::CallV(const char* format, std::va_list args) {
       return nullptr;
     }
   }
-  PyObject* result = PyObject_CallObject(callback, arguments);
+  // Held for the call: the callable may unregister or replace itself, or drop
+  // the object that holds it, while it runs.
+  PyObject* const callable = callback;
+  Py_INCREF(callable);
+  PyObject* result = PyObject_CallObject(callable, arguments);
   Py_XDECREF(arguments);
   if (PyErr_Occurred()) PyErr_Print();
+  Py_DECREF(callable);
   return result;
 }

@@ -70,7 +70,9 @@ PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* tok
 }
 
 PyPresetUploader::~PyPresetUploader() {
+  reports.Close();
   cancelRequested = true;
+  AllowThreadsGuard unlocked;  // neither the join nor the window's end needs Python
   JoinWorker();
   DestroyProxyWindow();
 }
@@ -183,6 +185,8 @@ void PyPresetUploader::DestroyProxyWindow() {
 void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32_t,
                                       std::uint32_t fileTimeLeft, std::uint32_t allSent,
                                       std::uint32_t allSize, std::uint32_t, std::uint32_t) {
+  const OperationGate::Pass report(reports);
+  if (!report) return;
   Call(kProgressFormat, kReportKind, kProgressEvent, Percentage(allSent, allSize),
        static_cast<int>(fileTimeLeft));
 }
@@ -190,6 +194,8 @@ void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32
 // Runs inside the proxy window's own command handler; the callable, called
 // last, may even destroy this object.
 void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
+  const OperationGate::Pass report(reports);
+  if (!report) return;
   TraceMessage(L"PyPresetUploader::OnBackgroundUploadComplete");
   uploadedUrl.clear();
   const std::string reply = JoinWorker();

@@ -14,6 +14,7 @@
 #include "transport/UploadRequest.h"
 #include "transport/UploadResult.h"
 #include "upload/CUploadProgressProxyWindow.h"
+#include "upload/OperationGate.h"
 #include "upload/PyCallbackWnd.h"
 #include "upload/UploadThread2.h"
 
@@ -25,6 +26,8 @@ class PyPresetUploader : public PyCallbackWnd, public BackgroundUploadProgress {
   PyPresetUploader(const wchar_t* serverHost, const wchar_t* token, const wchar_t* version,
                    const wchar_t* versionType, const wchar_t* uuid);
   // Cancels and waits for a running upload; reports still queued are dropped.
+  // On any thread: a report being handled on the UI thread is waited for first
+  // (unless this runs inside it), and no later report reaches this object.
   ~PyPresetUploader() override;
 
   // Registers the callable for reports; null or None unregisters. Returns 1.
@@ -101,4 +104,7 @@ class PyPresetUploader : public PyCallbackWnd, public BackgroundUploadProgress {
   std::unique_ptr<CUploadProgressProxyWindow> proxyWindow;
   // Written by the UI thread, read by the worker.
   std::atomic<bool> cancelRequested{false};
+  // Passed by the handling of each report, which calls Python and may release
+  // the interpreter lock, so that another thread may be destroying this object.
+  OperationGate reports;
 };

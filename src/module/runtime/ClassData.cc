@@ -1,5 +1,9 @@
 #include "module/runtime/ClassData.h"
 
+#include <map>
+#include <utility>
+#include <vector>
+
 #include "module/runtime/PyRef.h"
 #include "module/runtime/pointers.h"
 
@@ -28,10 +32,34 @@ void SetConstructor(ClassData& data, PyObject* cls) {
   }
 }
 
-void ShareWithCasts(TypeInfo& type, ClassData* data) {
-  type.classData = data;
+// How many types hold each class data that this module made.
+std::map<ClassData*, int>& Holders() {
+  static auto* holders = new std::map<ClassData*, int>;
+  return *holders;
+}
+
+// Points `type` at `data`; class data of this module that no type holds any
+// more is added to `unheld`.
+void Attach(TypeInfo& type, ClassData* data, std::vector<ClassData*>& unheld) {
+  ClassData* previous = std::exchange(type.classData, data);
+  ++Holders()[data];
+  const auto held = Holders().find(previous);
+  if (held != Holders().end() && --held->second == 0) {
+    Holders().erase(held);
+    unheld.push_back(previous);
+  }
+}
+
+// Cast types take the class when they have none, or the one `type` had until now.
+void ShareWithCasts(TypeInfo& type, ClassData* data, const ClassData* replaced,
+                    std::vector<ClassData*>& unheld) {
+  Attach(type, data, unheld);
   for (CastInfo* cast = type.casts; cast; cast = cast->next) {
-    if (!cast->converter && !cast->type->classData) ShareWithCasts(*cast->type, data);
+    TypeInfo& other = *cast->type;
+    if (cast->converter || other.classData == data) continue;
+    if (!other.classData || other.classData == replaced) {
+      ShareWithCasts(other, data, replaced, unheld);
+    }
   }
 }
 
@@ -59,14 +87,23 @@ void RegisterClass(TypeInfo& type, PyObject* cls) {
   data->destroy = OptionalAttribute(cls, "__swig_destroy__");
   data->destroyTakesTuple = !(data->destroy && TakesSingleObject(data->destroy));
   data->implicitConvBusy = 0;
-  ShareWithCasts(type, data);
+  std::vector<ClassData*> unheld;
+  ShareWithCasts(type, data, type.classData, unheld);
   type.ownsClassData = 1;
+  // Last: letting go of an old class may run Python code.
+  for (ClassData* old : unheld) {
+    ReleaseClassData(*old);
+    delete old;
+  }
 }
 
 PyObject* NewShadowInstance(const ClassData& data, PyObject* pointerObject) {
   PyRef instance;
   if (data.newRaw) {
-    instance = PyRef(PyObject_Call(data.newRaw, data.newArgs, nullptr));
+    // Held for the call: "__new__" may register another class, which frees `data`.
+    const PyRef newRaw = PyRef::Borrow(data.newRaw);
+    const PyRef newArgs = PyRef::Borrow(data.newArgs);
+    instance = PyRef(PyObject_Call(newRaw.get(), newArgs.get(), nullptr));
     // An instance that cannot hold "this" would lose the native object with it.
     if (instance && !StoreThis(instance.get(), pointerObject)) instance = PyRef();
   } else {

@@ -19,7 +19,8 @@ struct ClassData {
 
 // Builds the class's ClassData and attaches it to `type` and, recursively, to every
 // type in its cast list that has no converter and no class yet. Registering again
-// replaces the previous ClassData without releasing it: other types may share it.
+// replaces the previous ClassData wherever it was attached; one that this module
+// made is freed once no type holds it (another module's is left to that module).
 void RegisterClass(TypeInfo& type, PyObject* cls);
 
 // A new instance of the registered class holding `pointerObject` as "this"; null

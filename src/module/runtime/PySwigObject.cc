@@ -29,11 +29,13 @@ void CallDestroy(const PySwigObject& object, const ClassData& data) {
   PyObject *type, *value, *traceback;
   PyErr_Fetch(&type, &value, &traceback);
   PyRef standIn(NewPySwigObject(object.ptr, object.type, false));
+  // Held for the call: it may register another class, which frees `data`.
+  const PyRef destroy = PyRef::Borrow(data.destroy);
   if (standIn) {
     PyRef result(data.destroyTakesTuple
-                     ? PyObject_CallFunctionObjArgs(data.destroy, standIn.get(), nullptr)
-                     : PyCFunction_GET_FUNCTION(data.destroy)(PyCFunction_GET_SELF(data.destroy),
-                                                              standIn.get()));
+                     ? PyObject_CallFunctionObjArgs(destroy.get(), standIn.get(), nullptr)
+                     : PyCFunction_GET_FUNCTION(destroy.get())(PyCFunction_GET_SELF(destroy.get()),
+                                                               standIn.get()));
   }
   PyErr_Clear();  // a failing destroy is ignored
   PyErr_Restore(type, value, traceback);

@@ -4,6 +4,9 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <chrono>
+#include <functional>
+#include <future>
 #include <memory>
 #include <string>
 #include <thread>
@@ -20,6 +23,7 @@ struct Journal {
   std::thread::id dispatcher;
   std::vector<std::intptr_t> payloads;
   std::unique_ptr<ui::Window>* destroyOnFirst = nullptr;  // destroyed by its own handler
+  std::function<void()> duringDispatch;                    // run inside each handler
 };
 
 std::intptr_t RecordingProcedure(ui::Window& window, std::uint32_t message, std::uintptr_t, std::intptr_t lparam) {
@@ -29,6 +33,7 @@ std::intptr_t RecordingProcedure(ui::Window& window, std::uint32_t message, std:
   journal->payloads.push_back(*reinterpret_cast<int*>(lparam));
   delete reinterpret_cast<int*>(lparam);  // the handler owns what it is given
   if (journal->destroyOnFirst) std::exchange(journal->destroyOnFirst, nullptr)->reset();
+  if (journal->duringDispatch) journal->duringDispatch();
   return 0;
 }
 
@@ -102,6 +107,30 @@ TEST_F(WindowMessages, AHandlerMayDestroyItsOwnWindowWhileTheQueueDrains) {
   EXPECT_EQ(self.payloads, (std::vector<std::intptr_t>{1}));
   EXPECT_EQ(other.payloads, (std::vector<std::intptr_t>{10, 11}));
   EXPECT_EQ(droppedPayloads, 2);
+}
+
+TEST_F(WindowMessages, DestroyingOnAnotherThreadWaitsForTheDispatchUnderWayAndDropsTheRest) {
+  Journal journal;
+  auto window = MakeWindow(journal);
+  std::promise<void> entered;
+  std::atomic<bool> first{true}, handlerReturned{false};
+  journal.duringDispatch = [&] {
+    if (!first.exchange(false)) return;
+    entered.set_value();
+    // Long enough for the other thread to reach the destruction.
+    std::this_thread::sleep_for(std::chrono::milliseconds(50));
+    handlerReturned = true;
+  };
+  PostNumber(*window, 1);
+  PostNumber(*window, 2);
+  std::thread destroyer([&] {
+    ASSERT_EQ(entered.get_future().wait_for(std::chrono::seconds(10)), std::future_status::ready);
+    window.reset();
+    EXPECT_TRUE(handlerReturned);
+  });
+  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 1u);
+  destroyer.join();
+  EXPECT_EQ(droppedPayloads, 1);
 }
 
 TEST_F(WindowMessages, MessagesOfAThreadThatNeverDispatchesAreFreedWithItsWindows) {
