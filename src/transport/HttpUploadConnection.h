@@ -37,6 +37,10 @@ class HttpUploadConnection : public UploadConnection, private http::ConnectionEv
   void OnResponseReceived(std::uint32_t bytes) override;
   void OnClosingConnection() override;
   void OnConnectionClosed() override;
+  bool IsCancelled() override;
+
+  // A call abandoned at the listener's request ends the upload as cancelled.
+  win::Status CancelledOr(win::Status status);
 
   // Closed in reverse order: request, connection, session.
   UploadProgress* listener_;
