@@ -5,6 +5,16 @@
 #include "transport/UploadRequest.h"
 #include "transport/UploadStatus.h"
 
+namespace {
+
+// A call abandoned at the listener's request ends the upload as cancelled.
+win::Status CancelledOr(win::Status status) {
+  const bool cancelled = status == win::StatusFromWin32(win::kErrorInternetOperationCancelled);
+  return cancelled ? UPLOAD_E_CANCELLED : status;
+}
+
+}  // namespace
+
 UploadConnectionOpener HttpUploadConnection::Opener(std::uint16_t port) {
   return [port](const UploadRequest& request, UploadProgress* listener,
                 std::unique_ptr<UploadConnection>* out) {
@@ -71,8 +81,3 @@ void HttpUploadConnection::OnResponseReceived(std::uint32_t bytes) {
 void HttpUploadConnection::OnClosingConnection() { listener_->OnClosingConnection(); }
 void HttpUploadConnection::OnConnectionClosed() { listener_->OnConnectionClosed(); }
 bool HttpUploadConnection::IsCancelled() { return listener_->IsCancelled(); }
-
-win::Status HttpUploadConnection::CancelledOr(win::Status status) {
-  const bool cancelled = status == win::StatusFromWin32(win::kErrorInternetOperationCancelled);
-  return cancelled ? UPLOAD_E_CANCELLED : status;
-}

@@ -39,9 +39,6 @@ class HttpUploadConnection : public UploadConnection, private http::ConnectionEv
   void OnConnectionClosed() override;
   bool IsCancelled() override;
 
-  // A call abandoned at the listener's request ends the upload as cancelled.
-  win::Status CancelledOr(win::Status status);
-
   // Closed in reverse order: request, connection, session.
   UploadProgress* listener_;
   http::Session session_;
