@@ -1,8 +1,8 @@
 """What the module does at the edges of memory, files and time: a memory failure
 raises MemoryError and the host lives on; a registry hive that is a device, a
 FIFO or too large is not read; a FIFO or device is not uploaded; a server that
-drips its reply or never accepts is given up after 30 s; a cancel or a delete ends an upload
-within a second in every phase."""
+drips its reply or never accepts is given up after 30 s; a cancel or a delete
+ends an upload within a second in every phase."""
 import contextlib
 import errno
 import os
@@ -36,11 +36,6 @@ def release(fifo):
             raise
 
 
-# AddressSanitizer's allocator ends the process on a failed allocation by design.
-UNDER_ASAN = 'libasan' in os.environ.get('LD_PRELOAD', '')
-
-
-@unittest.skipIf(UNDER_ASAN, 'no allocation failure reaches the code under AddressSanitizer')
 @contextlib.contextmanager
 def never_accepting(port):
     """A listener on UNANSWERED_HOST whose accept queue is full, so that a
@@ -62,6 +57,11 @@ def new_session(server_host):
     return session
 
 
+# AddressSanitizer's allocator ends the process on a failed allocation by design.
+UNDER_ASAN = 'libasan' in os.environ.get('LD_PRELOAD', '')
+
+
+@unittest.skipIf(UNDER_ASAN, 'no allocation failure reaches the code under AddressSanitizer')
 class MemoryFailure(unittest.TestCase):
 
     # Two copies of one 128 MiB unicode are made; only one fits under the cap.
