@@ -3,6 +3,7 @@
 
 #include "module/function_table.h"
 #include "module/runtime/TypeTable.h"
+#include "module/runtime/exception_barrier.h"
 #include "module/types.h"
 #include "platform/http_global.h"
 
@@ -22,5 +23,9 @@ extern "C" __attribute__((visibility("default"))) void init_PyUploader() {
   PyObject* module =
       Py_InitModule4(kModuleName, module::FunctionTable(), nullptr, nullptr, kApiVersion);
   if (!module) return;  // the module defines no constants
-  binding::InitializeTypeTable(module::ModuleTypeTable());
+  // A failure raised here makes the import fail.
+  binding::RaiseOnException(0, [] {
+    binding::InitializeTypeTable(module::ModuleTypeTable());
+    return 0;
+  });
 }

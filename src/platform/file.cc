@@ -12,6 +12,8 @@
 namespace file {
 namespace {
 
+constexpr std::size_t kReadPieceBytes = 16 * 1024;
+
 win::Status StatusFromErrno(int error_number) {
   return win::StatusFromWin32(win::Win32FromErrno(error_number));
 }
@@ -23,6 +25,35 @@ bool ToNativePath(std::wstring_view path, std::string* native) {
   return true;
 }
 
+// The errno a file that is not regular is refused with.
+int NotRegularError(mode_t mode) { return S_ISDIR(mode) ? EISDIR : ENOENT; }
+
+// A descriptor of the regular file, or -1 with the reason in *error_number.
+int OpenRegular(const std::string& native, int* error_number) {
+  const int descriptor = ::open(native.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+  if (descriptor < 0) {
+    *error_number = errno;
+    return -1;
+  }
+  struct stat info;
+  if (::fstat(descriptor, &info) != 0) {
+    *error_number = errno;
+  } else if (!S_ISREG(info.st_mode)) {
+    *error_number = NotRegularError(info.st_mode);
+  } else {
+    return descriptor;
+  }
+  ::close(descriptor);
+  return -1;
+}
+
+ssize_t ReadRetrying(int descriptor, char* buffer, std::size_t capacity) {
+  for (;;) {
+    const ssize_t got = ::read(descriptor, buffer, capacity);
+    if (got >= 0 || errno != EINTR) return got;
+  }
+}
+
 }  // namespace
 
 File::~File() { Close(); }
@@ -31,21 +62,9 @@ win::Status File::Open(std::wstring_view path) {
   Close();
   std::string native;
   if (!ToNativePath(path, &native)) return win::StatusFromWin32(win::kErrorInvalidName);
-  const int descriptor = ::open(native.c_str(), O_RDONLY | O_CLOEXEC);
-  if (descriptor < 0) return StatusFromErrno(errno);
-  struct stat info;
   int error_number = 0;
-  if (::fstat(descriptor, &info) != 0) {
-    error_number = errno;
-  } else if (S_ISDIR(info.st_mode)) {
-    error_number = EISDIR;
-  }
-  if (error_number != 0) {
-    ::close(descriptor);
-    return StatusFromErrno(error_number);
-  }
-  descriptor_ = descriptor;
-  return win::kOk;
+  descriptor_ = OpenRegular(native, &error_number);
+  return descriptor_ < 0 ? StatusFromErrno(error_number) : win::kOk;
 }
 
 win::Status File::Size(std::uint64_t* size) const {
@@ -56,15 +75,9 @@ win::Status File::Size(std::uint64_t* size) const {
 }
 
 win::Status File::Read(char* buffer, std::size_t capacity, std::size_t* count) {
-  *count = 0;
-  for (;;) {
-    const ssize_t got = ::read(descriptor_, buffer, capacity);
-    if (got >= 0) {
-      *count = static_cast<std::size_t>(got);
-      return win::kOk;
-    }
-    if (errno != EINTR) return StatusFromErrno(errno);
-  }
+  const ssize_t got = ReadRetrying(descriptor_, buffer, capacity);
+  *count = got > 0 ? static_cast<std::size_t>(got) : 0;
+  return got < 0 ? StatusFromErrno(errno) : win::kOk;
 }
 
 void File::Close() {
@@ -72,10 +85,26 @@ void File::Close() {
   descriptor_ = -1;
 }
 
-bool PathExists(std::wstring_view path) {
+bool IsRegularFile(std::wstring_view path) {
   std::string native;
   struct stat info;
-  return ToNativePath(path, &native) && ::stat(native.c_str(), &info) == 0;
+  return ToNativePath(path, &native) && ::stat(native.c_str(), &info) == 0 && S_ISREG(info.st_mode);
+}
+
+std::optional<std::string> ReadSmallFile(const std::string& nativePath, std::size_t limit) {
+  int error_number = 0;
+  const int descriptor = OpenRegular(nativePath, &error_number);
+  if (descriptor < 0) return std::nullopt;
+  std::string bytes;
+  char piece[kReadPieceBytes];
+  ssize_t got = 0;
+  while ((got = ReadRetrying(descriptor, piece, sizeof piece)) > 0 &&
+         bytes.size() + static_cast<std::size_t>(got) <= limit) {
+    bytes.append(piece, static_cast<std::size_t>(got));
+  }
+  ::close(descriptor);
+  if (got != 0) return std::nullopt;  // a read failed, or the file is larger
+  return bytes;
 }
 
 }  // namespace file

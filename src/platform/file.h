@@ -4,6 +4,8 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
+#include <string>
 #include <string_view>
 
 #include "platform/win_error.h"
@@ -18,8 +20,10 @@ class File {
   File(const File&) = delete;
   File& operator=(const File&) = delete;
 
-  // Opens an existing regular file for reading. A directory is refused with
-  // access denied, as the system's file API refuses it.
+  // Opens an existing regular file for reading, without ever blocking (open() of
+  // a FIFO that has no writer would block for good). A directory is refused with
+  // access denied, as the system's file API refuses it; a FIFO, device or socket
+  // as a missing file, since only a regular file holds what is to be read.
   win::Status Open(std::wstring_view path);
   win::Status Size(std::uint64_t* size) const;
   // Reads up to `capacity` bytes; `*count` is 0 at the end of the file.
@@ -31,7 +35,11 @@ class File {
   int descriptor_ = -1;
 };
 
-// True when something (a file or a folder) exists at the path.
-bool PathExists(std::wstring_view path);
+// True when the path names a regular file (links followed); asking never blocks.
+bool IsRegularFile(std::wstring_view path);
+
+// The bytes of the regular file at the native path when it holds at most `limit`
+// of them; empty when it is missing, unreadable, not a regular file or larger.
+std::optional<std::string> ReadSmallFile(const std::string& nativePath, std::size_t limit);
 
 }  // namespace file

@@ -53,7 +53,9 @@ class Connection {
 };
 
 // One exchange. The verb is "GET" or "POST"; a GET has no body. Its handles are
-// released by the destructor, which abandons an exchange that was not ended.
+// released by the destructor, which abandons an exchange that was not ended. A
+// call that runs the transfer returns early when the session's events answer
+// IsCancelled; the time limits are those of http_limits.h.
 class Request {
  public:
   Request(const Connection& connection, std::string verb, std::string path);
@@ -68,9 +70,9 @@ class Request {
   // Returns once every byte of the piece has been taken for sending. Writing
   // past the announced length is refused.
   win::Status Write(std::string_view piece);
-  // Ends the body and reads the reply to its end.
+  // Ends the body and reads the reply to its end, for at most kReplyLimit.
   win::Status End();
-  // Start, Write and End for a body known whole.
+  // Start, Write and End for a body known whole, within kExchangeLimit in all.
   win::Status Send(std::string_view body);
 
   // 0 until a final reply head has arrived.

@@ -1,14 +1,13 @@
 #include "platform/http_driver.h"
 
+#include <algorithm>
+
+#include "platform/http_limits.h"
+
 namespace http {
 namespace {
 
-// Long enough to cost nothing; short enough that a cancel flag set without a
-// wake-up is seen promptly.
-constexpr int kPollMilliseconds = 50;
-constexpr long kConnectTimeoutSeconds = 60;
-// A transfer that moves no byte for this long is given up (a paused body is exempt).
-constexpr long kStallSeconds = 60;
+constexpr long kLowestSpeedBytesPerSecond = 1;
 
 }  // namespace
 
@@ -29,9 +28,9 @@ bool Driver::SetCommonOptions(const std::string& url, const std::string& agent) 
             curl_easy_setopt(e, CURLOPT_NOSIGNAL, 1L) == CURLE_OK &&
             curl_easy_setopt(e, CURLOPT_SSL_VERIFYPEER, 1L) == CURLE_OK &&
             curl_easy_setopt(e, CURLOPT_SSL_VERIFYHOST, 2L) == CURLE_OK &&
-            curl_easy_setopt(e, CURLOPT_CONNECTTIMEOUT, kConnectTimeoutSeconds) == CURLE_OK &&
-            curl_easy_setopt(e, CURLOPT_LOW_SPEED_LIMIT, 1L) == CURLE_OK &&
-            curl_easy_setopt(e, CURLOPT_LOW_SPEED_TIME, kStallSeconds) == CURLE_OK;
+            curl_easy_setopt(e, CURLOPT_CONNECTTIMEOUT, long{kConnectLimit.count()}) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_LOW_SPEED_LIMIT, kLowestSpeedBytesPerSecond) == CURLE_OK &&
+            curl_easy_setopt(e, CURLOPT_LOW_SPEED_TIME, long{kStallLimit.count()}) == CURLE_OK;
   if (ok && !agent.empty()) ok = curl_easy_setopt(e, CURLOPT_USERAGENT, agent.c_str()) == CURLE_OK;
   return ok;
 }
@@ -44,15 +43,28 @@ win::Status Driver::Begin() {
   return win::kOk;
 }
 
-void Driver::Run(const std::function<bool()>& until, const std::atomic<bool>* cancelled) {
+void Driver::Run(const std::function<bool()>& until, const StopPoll& stop) {
   for (;;) {
     if (!Perform() || finished_ || until()) return;
-    if (cancelled && cancelled->load()) return;
+    if ((stop && stop()) || PassedDeadline()) return;
     if (!Poll()) return;
   }
 }
 
 void Driver::Wakeup() { curl_multi_wakeup(multi_.get()); }
+
+void Driver::LimitTo(std::chrono::seconds seconds) {
+  const Clock::time_point deadline = Clock::now() + seconds;
+  if (!deadline_ || deadline < *deadline_) deadline_ = deadline;
+}
+
+// A transfer past its deadline ends as libcurl's own time limits end one.
+bool Driver::PassedDeadline() {
+  if (!deadline_ || Clock::now() < *deadline_) return false;
+  finished_ = true;
+  code_ = CURLE_OPERATION_TIMEDOUT;
+  return true;
+}
 
 win::Status Driver::result() const {
   return win::StatusFromWin32(win::Win32FromCurl(code_));
@@ -72,7 +84,13 @@ bool Driver::Perform() {
 
 // Waits for the network, one of libcurl's timers or a wake-up.
 bool Driver::Poll() {
-  return curl_multi_poll(multi_.get(), nullptr, 0, kPollMilliseconds, nullptr) == CURLM_OK;
+  auto wait = std::chrono::duration_cast<std::chrono::milliseconds>(kStopPollInterval);
+  if (deadline_) {
+    const auto left = std::chrono::ceil<std::chrono::milliseconds>(*deadline_ - Clock::now());
+    wait = std::clamp(left, std::chrono::milliseconds::zero(), wait);
+  }
+  return curl_multi_poll(multi_.get(), nullptr, 0, static_cast<int>(wait.count()), nullptr) ==
+         CURLM_OK;
 }
 
 void Driver::CollectFinished() {

@@ -21,6 +21,9 @@ class ConnectionEvents {
   virtual void OnResponseReceived(std::uint32_t bytes) = 0;
   virtual void OnClosingConnection() = 0;
   virtual void OnConnectionClosed() = 0;
+  // Asked while the request runs, at least every kStopPollInterval; true abandons
+  // it, and the call running fails with ERROR_INTERNET_OPERATION_CANCELLED.
+  virtual bool IsCancelled() { return false; }
 
  protected:
   ~ConnectionEvents() = default;

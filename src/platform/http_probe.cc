@@ -23,7 +23,7 @@ bool Probe::Open(const std::string& url) {
       win::Failed(driver_->Begin())) {
     return false;
   }
-  driver_->Run([this] { return reader_->head_received(); }, &cancelled_);
+  driver_->Run([this] { return reader_->head_received(); }, [this] { return cancelled_.load(); });
   return reader_->head_received();
 }
 

@@ -6,6 +6,7 @@
 #include "platform/http_body_feeder.h"
 #include "platform/http_driver.h"
 #include "platform/http_event_relay.h"
+#include "platform/http_limits.h"
 #include "platform/http_reply_reader.h"
 
 namespace http {
@@ -47,13 +48,15 @@ class Request::State {
       : verb_(std::move(verb)),
         url_(connection.UrlOf(path)),
         agent_(connection.session().agent()),
-        relay_(connection.session().events(), connection.host()),
+        events_(connection.session().events()),
+        relay_(events_, connection.host()),
         reader_(&relay_) {}
 
   win::Status AddHeaders(std::string_view block);
   win::Status Start(std::uint64_t content_length);
   win::Status Write(std::string_view piece);
   win::Status End();
+  void LimitTo(std::chrono::seconds seconds) { driver_.LimitTo(seconds); }
 
   const ReplyReader& reader() const { return reader_; }
   ReplyReader& reader() { return reader_; }
@@ -62,12 +65,16 @@ class Request::State {
   bool is_post() const { return verb_ == kPost; }
   bool Configure(std::uint64_t content_length);
   bool AddHeaderLine(const std::string& line);
+  // Runs the transfer until `until` holds, it ends, or the listener cancels it.
+  void Run(const std::function<bool()>& until);
+  bool CancelRequested() const { return events_ && events_->IsCancelled(); }
   // What a transfer that stopped early reports.
   win::Status Stopped() const;
 
   std::string verb_;
   std::string url_;
   std::string agent_;
+  ConnectionEvents* events_;  // not owned; may be null
   EventRelay relay_;
   ReplyReader reader_;
   BodyFeeder feeder_;
@@ -100,8 +107,9 @@ win::Status Request::State::Start(std::uint64_t content_length) {
   const win::Status begun = driver_.Begin();
   if (win::Failed(begun) || content_length == 0) return begun;
   // Run until libcurl has connected, sent the head and asks for the body.
-  driver_.Run([this] { return feeder_.waiting(); });
-  return driver_.finished() && win::Failed(driver_.result()) ? driver_.result() : win::kOk;
+  Run([this] { return feeder_.waiting(); });
+  if (driver_.finished()) return driver_.result();
+  return feeder_.waiting() ? win::kOk : Stopped();
 }
 
 win::Status Request::State::Write(std::string_view piece) {
@@ -111,7 +119,7 @@ win::Status Request::State::Write(std::string_view piece) {
   if (piece.empty()) return win::kOk;
   feeder_.Offer(piece);
   feeder_.Resume(driver_.easy());
-  driver_.Run([this] {
+  Run([this] {
     return feeder_.taken() && (feeder_.waiting() || feeder_.handed_over() == announced_);
   });
   return feeder_.taken() ? win::kOk : Stopped();
@@ -124,7 +132,8 @@ win::Status Request::State::End() {
   }
   feeder_.Finish();
   feeder_.Resume(driver_.easy());
-  driver_.Run([] { return false; });
+  driver_.LimitTo(kReplyLimit);
+  Run([] { return false; });
   return driver_.finished() ? driver_.result() : Stopped();
 }
 
@@ -152,8 +161,13 @@ bool Request::State::AddHeaderLine(const std::string& line) {
   return curl::Append(headers_, line.c_str());
 }
 
+void Request::State::Run(const std::function<bool()>& until) {
+  driver_.Run(until, [this] { return CancelRequested(); });
+}
+
 win::Status Request::State::Stopped() const {
   if (driver_.finished() && win::Failed(driver_.result())) return driver_.result();
+  if (CancelRequested()) return Fail(win::kErrorInternetOperationCancelled);
   return Fail(win::kErrorInternetConnectionAborted);
 }
 
@@ -168,6 +182,7 @@ win::Status Request::Write(std::string_view piece) { return state_->Write(piece)
 win::Status Request::End() { return state_->End(); }
 
 win::Status Request::Send(std::string_view body) {
+  state_->LimitTo(kExchangeLimit);
   win::Status status = Start(body.size());
   if (!win::Failed(status) && !body.empty()) status = Write(body);
   if (!win::Failed(status)) status = End();

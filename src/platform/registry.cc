@@ -1,9 +1,8 @@
 #include "platform/registry.h"
 
 #include <cstdlib>
-#include <fstream>
-#include <iterator>
 
+#include "platform/file.h"
 #include "platform/text.h"
 
 namespace registry {
@@ -18,6 +17,8 @@ constexpr std::string_view kUtf16LeMark = "\xFF\xFE";
 constexpr std::string_view kUtf8Mark = "\xEF\xBB\xBF";
 constexpr wchar_t kReplacement = 0xFFFD;
 constexpr std::size_t kNumberBytes = 4;
+// A hive holding a few switches is a few hundred bytes; anything beyond this is not one.
+constexpr std::size_t kHiveFileLimit = 1024 * 1024;
 
 using Bytes = std::vector<std::uint8_t>;
 using Values = std::map<std::wstring, Bytes>;
@@ -222,12 +223,6 @@ std::wstring SectionKey(std::wstring_view line) {
   return Fold(Trim(line.substr(0, close)));
 }
 
-std::optional<std::string> ReadFile(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  if (!in) return std::nullopt;
-  return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
-}
-
 }  // namespace
 
 std::string HivePath() {
@@ -236,7 +231,7 @@ std::string HivePath() {
 }
 
 std::optional<Key> Key::OpenLocalMachine(std::wstring_view subkey) {
-  const auto bytes = ReadFile(HivePath());
+  const auto bytes = file::ReadSmallFile(HivePath(), kHiveFileLimit);
   if (!bytes) return std::nullopt;
   return OpenInHiveFile(*bytes, subkey);
 }

@@ -27,7 +27,8 @@ inline constexpr char kDefaultHivePath[] = "/etc/pyuploader/registry.reg";
 class Key {
  public:
   // Opens `subkey` (e.g. L"SOFTWARE\\Maker\\Product") of the local-machine hive.
-  // Empty when the hive file cannot be read or holds no such key.
+  // Empty when the hive file cannot be read or holds no such key. Only a regular
+  // file of at most 1 MiB is read; anything else cannot be.
   static std::optional<Key> OpenLocalMachine(std::wstring_view subkey);
 
   // The same, from the bytes of a hive file.

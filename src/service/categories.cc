@@ -2,6 +2,7 @@
 // into the session's map, and the whole map handed to Python as a dictionary.
 #include <Python.h>
 
+#include <memory>
 #include <string>
 #include <utility>
 
@@ -58,10 +59,15 @@ void FillDictionary(PyObject* dictionary, const std::map<std::wstring, std::wstr
   }
 }
 
+struct PythonReference {
+  void operator()(PyObject* object) const { Py_DECREF(object); }
+};
+
 }  // namespace
 
 PyObject* OBLoginData::GetPresetCategory(const wchar_t* language) {
-  PyObject* dictionary = PyDict_New();
+  // Owned until returned: a failure (an exception) on the way must not leak it.
+  std::unique_ptr<PyObject, PythonReference> dictionary(PyDict_New());
   if (!dictionary) {
     PyErr_Clear();
     Py_RETURN_NONE;
@@ -73,8 +79,8 @@ PyObject* OBLoginData::GetPresetCategory(const wchar_t* language) {
   if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
     AddCategories(xml::Document(std::move(*reply)), m_mapCategory);
   }
-  FillDictionary(dictionary, m_mapCategory);
-  return dictionary;
+  FillDictionary(dictionary.get(), m_mapCategory);
+  return dictionary.release();
 }
 
 int OBLoginData::GetCategroyName(int id, std::wstring& name) const {

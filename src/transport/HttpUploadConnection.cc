@@ -3,6 +3,17 @@
 #include "platform/text.h"
 #include "transport/UploadProgress.h"
 #include "transport/UploadRequest.h"
+#include "transport/UploadStatus.h"
+
+namespace {
+
+// A call abandoned at the listener's request ends the upload as cancelled.
+win::Status CancelledOr(win::Status status) {
+  const bool cancelled = status == win::StatusFromWin32(win::kErrorInternetOperationCancelled);
+  return cancelled ? UPLOAD_E_CANCELLED : status;
+}
+
+}  // namespace
 
 UploadConnectionOpener HttpUploadConnection::Opener(std::uint16_t port) {
   return [port](const UploadRequest& request, UploadProgress* listener,
@@ -24,15 +35,17 @@ win::Status HttpUploadConnection::AddHeader(const std::string& line) {
 }
 
 win::Status HttpUploadConnection::Start(std::uint32_t contentLength) {
-  return request_.Start(contentLength);
+  return CancelledOr(request_.Start(contentLength));
 }
 
-win::Status HttpUploadConnection::Write(std::string_view piece) { return request_.Write(piece); }
+win::Status HttpUploadConnection::Write(std::string_view piece) {
+  return CancelledOr(request_.Write(piece));
+}
 
 // A reply whose head arrived has ended the request, even when its body could
 // not be read whole.
 win::Status HttpUploadConnection::End() {
-  const win::Status ended = request_.End();
+  const win::Status ended = CancelledOr(request_.End());
   return request_.status_code() != 0 ? win::kOk : ended;
 }
 
@@ -67,3 +80,4 @@ void HttpUploadConnection::OnResponseReceived(std::uint32_t bytes) {
 }
 void HttpUploadConnection::OnClosingConnection() { listener_->OnClosingConnection(); }
 void HttpUploadConnection::OnConnectionClosed() { listener_->OnConnectionClosed(); }
+bool HttpUploadConnection::IsCancelled() { return listener_->IsCancelled(); }

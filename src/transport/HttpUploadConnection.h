@@ -37,6 +37,7 @@ class HttpUploadConnection : public UploadConnection, private http::ConnectionEv
   void OnResponseReceived(std::uint32_t bytes) override;
   void OnClosingConnection() override;
   void OnConnectionClosed() override;
+  bool IsCancelled() override;
 
   // Closed in reverse order: request, connection, session.
   UploadProgress* listener_;

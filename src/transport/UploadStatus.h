@@ -3,5 +3,6 @@
 
 #include "platform/win_error.h"
 
-// The listener's IsCancelled answered true while a file was streaming.
+// The listener's IsCancelled answered true: while a file streamed, or while the
+// request ran (connecting, sending, awaiting the reply).
 constexpr win::Status UPLOAD_E_CANCELLED = static_cast<win::Status>(0x80040301u);

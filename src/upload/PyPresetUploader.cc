@@ -48,7 +48,8 @@ std::unique_ptr<char[]> FieldValue(const wchar_t* text) {
   return std::unique_ptr<char[]>(value);
 }
 
-bool FileGiven(const wchar_t* path) { return path != nullptr && file::PathExists(path); }
+// Only a regular file can be sent: a FIFO or device would hold the upload.
+bool FileGiven(const wchar_t* path) { return path != nullptr && file::IsRegularFile(path); }
 
 // Whole percent of the bytes sent; nothing to send counts as all sent.
 int Percentage(std::uint32_t sent, std::uint32_t total) {

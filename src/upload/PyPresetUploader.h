@@ -42,7 +42,7 @@ class PyPresetUploader : public PyCallbackWnd, public BackgroundUploadProgress {
                   const wchar_t* image9, const wchar_t* image10, const wchar_t* image11,
                   const wchar_t* image12, const wchar_t* templateKey, const wchar_t* title,
                   const wchar_t* category, const wchar_t* tags, const wchar_t* description);
-  // Takes effect at the engine's next cancel poll, while a file streams.
+  // Takes effect at the engine's next cancel poll, in every phase of the upload.
   void CancelUpload() { cancelRequested = true; }
   // A new unicode object: the published preset's URL, or empty.
   PyObject* GetUploadedFileUrl() const;

@@ -14,7 +14,8 @@ Replies (see reply()) may also set: delay (seconds before answering), pieces
 no_length (no Content-Length, close after the body), close_after (bytes of
 the reply, then close), hang (take the request, never answer), read_rate
 (read the request body at that many bytes per second) and abort_after (drop
-the connection after that many body bytes). A reply without a status or a
+the connection after that many body bytes) and drip (send the whole reply,
+head included, at that many bytes per second). A reply without a status or a
 body answers as the plausible service would, with those options applied.
 
 Host states: 'up', 'down' (connections refused) and 'hang' (accepted, the

@@ -18,7 +18,7 @@ XML = ['Content-Type', 'text/xml; charset=UTF-8']
 ANNOUNCED = 100 * 1024 * 1024
 NESTING = 100000
 TEN_MB = 10 * 1000 * 1000
-LATE = 30  # seconds
+LATE = 20  # seconds: late, but within the 30 s an exchange or a reply may take
 PROBE_BOUND = 5.5  # seconds a reachability probe is waited for
 SLACK = 10.0  # seconds of scheduling a bound may take beyond itself
 GARBAGE = 'SSH-2.0-OpenSSH_9.2\r\n\x00\x01\xfe\xff<<binary>>\r\n\r\n'

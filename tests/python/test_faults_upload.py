@@ -69,7 +69,7 @@ ROWS = [
     ('file truncated', last_image, (WHILE_STREAMING, truncate), SLOW, FILE_PARTS - 1, False),
     ('file grown', last_image, (WHILE_STREAMING, grow), SLOW, FILE_PARTS - 1, False),
     ('sparse 4 GiB file', last_image, (BEFORE, make_sparse), [], 0, False),
-    ('folder as image', lambda files: files.images[0], (BEFORE, make_folder), [], 1, False),
+    ('folder as image 7', lambda files: files.images[6], (BEFORE, make_folder), [], 8, False),
     ('unreadable image', lambda files: files.images[2], (BEFORE, make_unreadable), [], 4, False),
 ]
 

@@ -13,6 +13,7 @@ import subprocess
 import sys
 import tempfile
 import textwrap
+import threading
 
 HEADER = u'Windows Registry Editor Version 5.00\r\n\r\n'
 KEY = u'[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n'
@@ -53,13 +54,19 @@ class TraceRun(object):
             env['PYUPLOADER_DEBUG_OUTPUT'] = self.output
         return env
 
-    def run(self, code, capture=True):
+    def run(self, code, capture=True, timeout=60):
         """Runs `code` in a fresh interpreter; returns (exit code, stdout, stderr).
-        The code finds the hive's path in the variable HIVE."""
+        The code finds the hive's path in the variable HIVE. An interpreter still
+        running after `timeout` seconds is killed (exit code -9)."""
         code = 'HIVE = %r\n' % self.hive + textwrap.dedent(code)
         proc = subprocess.Popen([sys.executable, '-c', code], stdout=subprocess.PIPE,
                                 stderr=subprocess.PIPE, env=self.environment(capture))
-        out, err = proc.communicate()
+        killer = threading.Timer(timeout, proc.kill)
+        killer.start()
+        try:
+            out, err = proc.communicate()
+        finally:
+            killer.cancel()
         return proc.returncode, out, err
 
     def text(self):

@@ -24,9 +24,12 @@ class ReplyWriter(object):
         if reply.get('chunked'):
             pieces = [b'%x\r\n%s\r\n' % (len(p), p) for p in pieces if p] + [b'0\r\n\r\n']
         pieces[0] = self._head(reply, body, head) + pieces[0]
+        pause = reply.get('pause', DEFAULT_PAUSE)
+        if reply.get('drip'):
+            pieces, pause = self._drip(b''.join(pieces), reply['drip'])
         for index, piece in enumerate(pieces):
             if index:
-                time.sleep(reply.get('pause', DEFAULT_PAUSE))
+                time.sleep(pause)
             if not self._write(piece):
                 return False
         return not (reply.get('no_length') or self._budget is not None or head.wants_close()
@@ -56,6 +59,11 @@ class ReplyWriter(object):
             at += size
         out.append(body[at:])
         return [p for p in out if p] or [b'']
+
+    @staticmethod
+    def _drip(data, bytes_per_second):
+        """The whole reply, head included, a byte at a time at that rate."""
+        return [data[i:i + 1] for i in range(len(data))], 1.0 / bytes_per_second
 
     def _head(self, reply, body, head):
         status = int(reply.get('status', 200))

@@ -12,6 +12,7 @@ ANY = '*'
 REPLY_KEYS = frozenset([
     'status', 'reason', 'headers', 'body', 'body_b64', 'raw_b64', 'delay', 'pieces',
     'pause', 'chunked', 'no_length', 'close_after', 'hang', 'read_rate', 'abort_after',
+    'drip',
 ])
 
 

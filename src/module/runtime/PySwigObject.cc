@@ -7,6 +7,7 @@
 #include "module/runtime/ClassData.h"
 #include "module/runtime/PyRef.h"
 #include "module/runtime/StaticType.h"
+#include "module/runtime/exception_barrier.h"
 #include "module/runtime/text_form.h"
 
 namespace binding {
@@ -62,14 +63,16 @@ void Dealloc(PyObject* self) {
 }
 
 PyObject* ReprSlot(PyObject* self) {
-  PySwigObject& object = *AsObject(self);
-  std::string text = Repr(object);
-  if (object.next) {
-    PyRef nextText(PyObject_Repr(object.next));  // its recursion limit guards long chains
-    if (!nextText) return nullptr;
-    text += PyString_AsString(nextText.get());
-  }
-  return PyString_FromStringAndSize(text.data(), text.size());
+  return RaiseOnException<PyObject*>(nullptr, [self]() -> PyObject* {
+    PySwigObject& object = *AsObject(self);
+    std::string text = Repr(object);
+    if (object.next) {
+      PyRef nextText(PyObject_Repr(object.next));  // its recursion limit guards long chains
+      if (!nextText) return nullptr;
+      text += PyString_AsString(nextText.get());
+    }
+    return PyString_FromStringAndSize(text.data(), text.size());
+  });
 }
 
 int PrintSlot(PyObject* self, FILE* file, int) {
@@ -80,9 +83,11 @@ int PrintSlot(PyObject* self, FILE* file, int) {
 }
 
 PyObject* StrSlot(PyObject* self) {
-  PySwigObject& object = *AsObject(self);
-  std::string text = "_" + PackBytes(&object.ptr, sizeof object.ptr) + object.type->mangledName;
-  return PyString_FromStringAndSize(text.data(), text.size());
+  return RaiseOnException<PyObject*>(nullptr, [self] {
+    PySwigObject& object = *AsObject(self);
+    std::string text = "_" + PackBytes(&object.ptr, sizeof object.ptr) + object.type->mangledName;
+    return PyString_FromStringAndSize(text.data(), text.size());
+  });
 }
 
 int CompareSlot(PyObject* left, PyObject* right) {
@@ -94,7 +99,9 @@ int CompareSlot(PyObject* left, PyObject* right) {
 PyObject* LongSlot(PyObject* self) { return PyLong_FromVoidPtr(AsObject(self)->ptr); }
 
 PyObject* FormattedAddress(PyObject* self, const char* format) {
-  return PyString_FromString(FormatAddress(format, AsObject(self)->ptr).c_str());
+  return RaiseOnException<PyObject*>(nullptr, [self, format] {
+    return PyString_FromString(FormatAddress(format, AsObject(self)->ptr).c_str());
+  });
 }
 PyObject* OctSlot(PyObject* self) { return FormattedAddress(self, "%" PRIoPTR); }
 PyObject* HexSlot(PyObject* self) { return FormattedAddress(self, "%" PRIxPTR); }

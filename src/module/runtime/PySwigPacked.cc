@@ -7,6 +7,7 @@
 #include <string>
 
 #include "module/runtime/StaticType.h"
+#include "module/runtime/exception_barrier.h"
 #include "module/runtime/text_form.h"
 
 namespace binding {
@@ -32,19 +33,25 @@ std::string Repr(const PySwigPacked& packed) {
 }
 
 PyObject* ReprSlot(PyObject* self) {
-  std::string text = Repr(*AsPacked(self));
-  return PyString_FromStringAndSize(text.data(), text.size());
+  return RaiseOnException<PyObject*>(nullptr, [self] {
+    std::string text = Repr(*AsPacked(self));
+    return PyString_FromStringAndSize(text.data(), text.size());
+  });
 }
 
 PyObject* StrSlot(PyObject* self) {
-  const PySwigPacked& packed = *AsPacked(self);
-  std::string text = PackedForm(packed).value_or("") + packed.type->mangledName;
-  return PyString_FromStringAndSize(text.data(), text.size());
+  return RaiseOnException<PyObject*>(nullptr, [self] {
+    const PySwigPacked& packed = *AsPacked(self);
+    std::string text = PackedForm(packed).value_or("") + packed.type->mangledName;
+    return PyString_FromStringAndSize(text.data(), text.size());
+  });
 }
 
 int PrintSlot(PyObject* self, FILE* file, int) {
-  std::fputs(Repr(*AsPacked(self)).c_str(), file);
-  return 0;
+  return RaiseOnException(-1, [self, file] {
+    std::fputs(Repr(*AsPacked(self)).c_str(), file);
+    return 0;
+  });
 }
 
 int CompareSlot(PyObject* left, PyObject* right) {

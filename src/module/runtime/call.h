@@ -7,6 +7,8 @@
 //      (setters and delete_ functions) is null;
 //   4. call the native operation with the converted values, in order;
 //   5. convert its result by the result kind; the copies are freed on return.
+// An exception from any step raises MemoryError or RuntimeError (exception_barrier.h)
+// and returns null, with the copies freed as well.
 // A module function is then one statement, for example:
 //   PyObject* Thing_SetName(PyObject*, PyObject* args) {
 //     return Call(args, "Thing_SetName", ReturnsNone{},
@@ -24,6 +26,7 @@
 
 #include "module/runtime/ClassData.h"
 #include "module/runtime/argument_kinds.h"
+#include "module/runtime/exception_barrier.h"
 #include "module/runtime/result_kinds.h"
 
 namespace binding {
@@ -60,8 +63,10 @@ PyObject* Run(std::index_sequence<I...>, PyObject* args, const char* function,
 template <typename Result, typename Op, typename... Kinds>
 PyObject* Call(PyObject* args, const char* function, const Result& result, Op op,
                const Kinds&... kinds) {
-  return call_detail::Run(std::index_sequence_for<Kinds...>{}, args, function, result, op,
-                          kinds...);
+  return RaiseOnException<PyObject*>(nullptr, [&] {
+    return call_detail::Run(std::index_sequence_for<Kinds...>{}, args, function, result, op,
+                            kinds...);
+  });
 }
 
 // A "delete_" function: converts its one argument with POINTER_DISOWN and deletes the
@@ -76,8 +81,10 @@ PyObject* Delete(PyObject* args, const char* function, TypeInfo* type, const cha
 inline PyObject* Register(PyObject* args, TypeInfo* type) {
   PyObject* cls = nullptr;
   if (!PyArg_UnpackTuple(args, "swigregister", 1, 1, &cls)) return nullptr;
-  RegisterClass(*type, cls);
-  Py_RETURN_NONE;
+  return RaiseOnException<PyObject*>(nullptr, [&] {
+    RegisterClass(*type, cls);
+    Py_RETURN_NONE;
+  });
 }
 
 }  // namespace binding

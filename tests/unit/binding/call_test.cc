@@ -6,6 +6,8 @@
 #include <gtest/gtest.h>
 
 #include <array>
+#include <new>
+#include <stdexcept>
 #include <string>
 
 #include "module/runtime/call.h"
@@ -65,8 +67,20 @@ PyObject* SetName(PyObject*, PyObject* args) {
               ThingArg(OnNull::kSkipCall), Reference<std::wstring>(Type(TestType::CString), "CString &"));
 }
 
+// throws(which, wide): the operation throws, after a copy of `wide` was made.
+PyObject* Throws(PyObject*, PyObject* args) {
+  return Call(args, "throws", ReturnsNone{},
+              [](int which, const wchar_t*) {
+                if (which == 0) throw std::bad_alloc();
+                if (which == 1) throw std::length_error("text too long");
+                throw which;
+              },
+              Integer("int"), WideString());
+}
+
 PyMethodDef g_functions[] = {
     {"kinds", Kinds, METH_VARARGS, nullptr},
+    {"throws", Throws, METH_VARARGS, nullptr},
     {"set_name", SetName, METH_VARARGS, nullptr},
     {nullptr, nullptr, 0, nullptr},
 };
@@ -125,6 +139,13 @@ TEST_F(CallSequence, CopiesMadeBeforeARefusalAreFreed) {
     EXPECT_EQ(TakeError(), "TypeError: in method 'kinds', argument 4 of type 'int'");
   }
   EXPECT_EQ(g_received.calls, 0);
+}
+
+// The leak checker would report a copy left behind by the unwinding.
+TEST_F(CallSequence, AnExceptionBecomesAPythonErrorAndFreesTheCopies) {
+  EXPECT_EQ(ErrorOf("calltest.throws(0, u'copied' * 100)"), "MemoryError: ");
+  EXPECT_EQ(ErrorOf("calltest.throws(1, u'copied' * 100)"), "RuntimeError: text too long");
+  EXPECT_EQ(ErrorOf("calltest.throws(2, u'copied' * 100)"), "RuntimeError: unknown C++ exception");
 }
 
 TEST_F(CallSequence, ASetterWithANullObjectDoesNothing) {

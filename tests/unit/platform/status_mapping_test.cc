@@ -1,4 +1,7 @@
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 #include <cstdint>
 #include <filesystem>
@@ -37,25 +40,32 @@ TEST_F(LocalFile, OpensAWidePathStoredAsUtf8AndReadsItToTheEnd) {
   EXPECT_EQ(std::string(buffer, count), "456789");
   ASSERT_EQ(source.Read(buffer, sizeof buffer, &count), win::kOk);
   EXPECT_EQ(count, 0u);
-  EXPECT_TRUE(file::PathExists(path));
+  EXPECT_TRUE(file::IsRegularFile(path));
 }
 
+// Only a regular file is read: a FIFO or device fails as a missing file does.
 TEST_F(LocalFile, FailuresToOpenCarryTheWindowsStatus) {
   const std::wstring plain = PathOf("plain", "x");
+  const std::wstring fifo = PathOf("fifo");
+  ASSERT_EQ(::mkfifo(text::WideToUtf8(fifo).c_str(), 0600), 0);
+  // Held open for writing, so that an open() that waits for a writer cannot hang the test.
+  const int writer = ::open(text::WideToUtf8(fifo).c_str(), O_RDWR | O_NONBLOCK);
+  ASSERT_GE(writer, 0);
   struct Case {
     std::wstring path;
     std::uint32_t status;
   };
   for (const Case& c : {Case{PathOf("missing"), 0x80070002u}, Case{plain + L"/below", 0x80070003u},
-                        Case{PathOf(""), 0x80070005u},
+                        Case{PathOf(""), 0x80070005u}, Case{fifo, 0x80070002u},
+                        Case{L"/dev/zero", 0x80070002u},
                         Case{std::wstring(L"a\0b", 3), 0x8007007Bu}}) {
     file::File source;
     EXPECT_EQ(static_cast<std::uint32_t>(source.Open(c.path)), c.status)
         << text::WideToUtf8(c.path);
     EXPECT_FALSE(source.is_open());
+    EXPECT_FALSE(file::IsRegularFile(c.path));
   }
-  EXPECT_FALSE(file::PathExists(PathOf("missing")));
-  EXPECT_TRUE(file::PathExists(PathOf("")));
+  ::close(writer);
 }
 
 }  // namespace
