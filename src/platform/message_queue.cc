@@ -79,11 +79,21 @@ std::size_t MessageQueue::Drain() {
   std::size_t dispatched = 0;
   Entry entry;
   while (TakeNext(entry)) {
-    entry.window->Dispatch(entry.message, entry.wparam, entry.lparam);
+    DispatchOne(entry);
     EndDispatch();
     ++dispatched;
   }
   return dispatched;
+}
+
+// The drain runs inside the interpreter's pending calls, where an exception
+// would end the process: a procedure that throws (memory running out) loses
+// its own message, and the rest of the queue is still dispatched.
+void MessageQueue::DispatchOne(const Entry& entry) noexcept {
+  try {
+    entry.window->Dispatch(entry.message, entry.wparam, entry.lparam);
+  } catch (...) {
+  }
 }
 
 void MessageQueue::Drop(std::deque<Entry>& entries) {

@@ -63,6 +63,7 @@ class MessageQueue {
   void EndDispatch();
   bool Dispatching(const Window& window) const;
   std::size_t Drain();
+  static void DispatchOne(const Entry& entry) noexcept;
   static void Drop(std::deque<Entry>& entries);
 
   const std::thread::id owner_ = std::this_thread::get_id();

@@ -17,9 +17,14 @@ bool Thread::Start() {
   return true;
 }
 
+// An exception leaving a thread's body would end the whole process.
 std::uint32_t Thread::ThreadEntry(Thread* thread) {
   thread->WaitAtStartGate();
-  thread->exitCode = thread->Run();
+  try {
+    thread->exitCode = thread->Run();
+  } catch (...) {
+    thread->exitCode = kRunFailed;
+  }
   return thread->exitCode;
 }
 

@@ -19,8 +19,10 @@ class Thread {
   // `handle` and `threadId` are both stored.
   bool Start();
   // Waits without a time-out for the thread to end and returns what Run
-  // returned; 0 when no thread was started.
+  // returned (kRunFailed when it threw); 0 when no thread was started.
   std::uint32_t Join();
+
+  static constexpr std::uint32_t kRunFailed = 0x8000FFFFu;  // E_UNEXPECTED
 
  protected:
   // The thread's body; its result is the thread's exit code.

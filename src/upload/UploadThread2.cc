@@ -1,5 +1,8 @@
 #include "upload/UploadThread2.h"
 
+#include <new>
+#include <utility>
+
 #include "transport/BackgroundUploadProgress.h"
 #include "transport/UploadResult.h"
 #include "transport/Uploader.h"
@@ -9,11 +12,22 @@ UploadThread2::UploadThread2(UploadRequest* request, UploadResult* result,
     : request(request), result(result), listener(listener) {}
 
 std::uint32_t UploadThread2::Run() {
-  Uploader uploader(listener, request, result);
-  const win::Status status = uploader.Upload();
+  const win::Status status = RunUpload();
   result->hr = status;
-  reply = uploader.reply;
   // Raised last, so that it reaches the UI thread after every other event.
   listener->OnBackgroundUploadComplete(status);
   return static_cast<std::uint32_t>(status);
+}
+
+// Memory running out on this thread fails the upload like a chunk buffer that
+// cannot be had, and the completion is still reported.
+win::Status UploadThread2::RunUpload() {
+  try {
+    Uploader uploader(listener, request, result);
+    const win::Status status = uploader.Upload();
+    reply = std::move(uploader.reply);
+    return status;
+  } catch (const std::bad_alloc&) {
+    return win::StatusFromWin32(win::kErrorNotEnoughMemory);
+  }
 }

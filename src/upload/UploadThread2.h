@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <string>
 
+#include "platform/win_error.h"
 #include "upload/Thread.h"
 
 class BackgroundUploadProgress;
@@ -24,6 +25,8 @@ class UploadThread2 : public Thread {
   std::uint32_t Run() override;
 
  private:
+  win::Status RunUpload();
+
   UploadRequest* request;
   UploadResult* result;
   BackgroundUploadProgress* listener;

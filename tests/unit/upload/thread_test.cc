@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <new>
 #include <vector>
 
 namespace {
@@ -57,6 +58,15 @@ TEST(ThreadTest, JoinReturnsWhatRunReturnedAndOnlyOnce) {
   ASSERT_TRUE(thread.Start());
   EXPECT_EQ(thread.Join(), 0x80040301u);
   EXPECT_EQ(thread.Join(), 0u);  // nothing left to wait for
+}
+
+// An exception leaving the body would end the process.
+TEST(ThreadTest, ABodyThatThrowsEndsItsThreadWithAFailure) {
+  struct Throwing : Thread {
+    std::uint32_t Run() override { throw std::bad_alloc(); }
+  } thread;
+  ASSERT_TRUE(thread.Start());
+  EXPECT_EQ(thread.Join(), Thread::kRunFailed);
 }
 
 TEST(ThreadTest, AThreadNeverStartedJoinsAtOnceAndDestroysCleanly) {

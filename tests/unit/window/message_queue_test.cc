@@ -8,6 +8,7 @@
 #include <functional>
 #include <future>
 #include <memory>
+#include <new>
 #include <string>
 #include <thread>
 #include <vector>
@@ -131,6 +132,21 @@ TEST_F(WindowMessages, DestroyingOnAnotherThreadWaitsForTheDispatchUnderWayAndDr
   EXPECT_EQ(ui::MessageQueue::DispatchPending(), 1u);
   destroyer.join();
   EXPECT_EQ(droppedPayloads, 1);
+}
+
+// A throw out of a handler would end the process inside the interpreter's
+// pending call; it must cost only its own message.
+TEST_F(WindowMessages, AHandlerThatThrowsLosesOnlyItsOwnMessage) {
+  Journal journal;
+  auto window = MakeWindow(journal);
+  journal.duringDispatch = [&] {
+    if (journal.payloads.size() == 1) throw std::bad_alloc();
+  };
+  for (int i = 0; i < 3; ++i) PostNumber(*window, i);
+  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 3u);
+  EXPECT_EQ(journal.payloads, (std::vector<std::intptr_t>{0, 1, 2}));
+  PostNumber(*window, 3);
+  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 1u);
 }
 
 TEST_F(WindowMessages, MessagesOfAThreadThatNeverDispatchesAreFreedWithItsWindows) {
