@@ -5,11 +5,13 @@
 #include "transport/Uploader.h"
 
 UploadThread2::UploadThread2(UploadRequest* request, UploadResult* result,
-                             BackgroundUploadProgress* listener)
-    : request(request), result(result), listener(listener) {}
+                             BackgroundUploadProgress* listener, std::uint32_t chunkPauseMs)
+    : request(request), result(result), listener(listener), chunkPauseMs(chunkPauseMs) {}
 
 std::uint32_t UploadThread2::Run() {
-  Uploader uploader(listener, request, result);
+  UploadEnvironment environment = UploadEnvironment::Platform();
+  environment.pauseAfterChunkMs = chunkPauseMs;
+  Uploader uploader(listener, request, result, std::move(environment));
   const win::Status status = uploader.Upload();
   result->hr = status;
   reply = uploader.reply;
