@@ -7,7 +7,10 @@ itself once, so the native object is destroyed when the instance goes away.
 import _PyUploader as _native
 
 
-def _member(getter, setter, doc):
+def _member(cls_name, name, doc):
+    """The data member `name` through its "_get" and "_set" functions."""
+    getter = getattr(_native, "%s_%s_get" % (cls_name, name))
+    setter = getattr(_native, "%s_%s_set" % (cls_name, name))
     return property(lambda self: getter(self), lambda self, value: setter(self, value), doc=doc)
 
 
@@ -20,12 +23,9 @@ class infoEffectURL(object):
         """Makes the record from copies of three "CString *" objects."""
         self.this = _native.new_infoEffectURL(effect, tag, url)
 
-    strEffect = _member(_native.infoEffectURL_strEffect_get, _native.infoEffectURL_strEffect_set,
-                        "The effect, a copy as a new \"CString *\" object.")
-    strTag = _member(_native.infoEffectURL_strTag_get, _native.infoEffectURL_strTag_set,
-                     "The tag, a copy as a new \"CString *\" object.")
-    strURL = _member(_native.infoEffectURL_strURL_get, _native.infoEffectURL_strURL_set,
-                     "The URL, a copy as a new \"CString *\" object.")
+    strEffect = _member('infoEffectURL', 'strEffect', 'The effect, as a new "CString *".')
+    strTag = _member('infoEffectURL', 'strTag', 'The tag, as a new "CString *".')
+    strURL = _member('infoEffectURL', 'strURL', 'The URL, as a new "CString *".')
 
 
 _native.infoEffectURL_swigregister(infoEffectURL)
@@ -117,18 +117,11 @@ class OBLoginData(object):
         """Where the picture-in-picture effect `guid` can be downloaded, or None."""
         return _native.OBLoginData_GetEffectByGUID(self, guid)
 
-    m_hInternet = _member(_native.OBLoginData_m_hInternet_get, _native.OBLoginData_m_hInternet_set,
-                          "The session's internet handle, as an \"HINTERNET *\" object.")
-    m_hConnect = _member(_native.OBLoginData_m_hConnect_get, _native.OBLoginData_m_hConnect_set,
-                         "The session's connection handle, as an \"HINTERNET *\" object.")
-    m_hRequest = _member(_native.OBLoginData_m_hRequest_get, _native.OBLoginData_m_hRequest_set,
-                         "The session's request handle, as an \"HINTERNET *\" object.")
-    m_bServerReachable = _member(_native.OBLoginData_m_bServerReachable_get,
-                                 _native.OBLoginData_m_bServerReachable_set,
-                                 "Whether the last reachability check got through (int).")
-    m_szChkServerUrl = _member(_native.OBLoginData_m_szChkServerUrl_get,
-                               _native.OBLoginData_m_szChkServerUrl_set,
-                               "The address the reachability check tries (str).")
+    m_hInternet = _member('OBLoginData', 'm_hInternet', 'The internet handle.')
+    m_hConnect = _member('OBLoginData', 'm_hConnect', 'The connection handle.')
+    m_hRequest = _member('OBLoginData', 'm_hRequest', 'The request handle.')
+    m_bServerReachable = _member('OBLoginData', 'm_bServerReachable', 'Reachable at last check.')
+    m_szChkServerUrl = _member('OBLoginData', 'm_szChkServerUrl', 'The reachability check address.')
 
 
 _native.OBLoginData_swigregister(OBLoginData)
