@@ -10,6 +10,7 @@
 #include "platform/text.h"
 #include "platform/xml.h"
 #include "service/unescape_url.h"
+#include "transport/ChunkPause.h"
 #include "transport/WideToUtf8.h"
 #include "upload/AllowThreadsGuard.h"
 #include "upload/OnInterpreterMainThread.h"
@@ -68,6 +69,8 @@ PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* tok
       version(Narrow(version)),
       versionType(Narrow(versionType)) {
   TraceSetPrefix(kTraceName);
+  // After the prefix: a refused setting is traced behind this object's name.
+  chunkPauseMs = ChunkPause::FromEnvironment();
 }
 
 PyPresetUploader::~PyPresetUploader() {
@@ -157,7 +160,8 @@ bool PyPresetUploader::StartWorker() {
                                 CUploadProgressProxyWindow::kForwardRequestSent));
   if (proxyWindow->CreateHiddenWindow()) {
     uploadThread.reset(new (std::nothrow)
-                           UploadThread2(&uploadRequest, &uploadResult, proxyWindow.get()));
+                           UploadThread2(&uploadRequest, &uploadResult, proxyWindow.get(),
+                                         chunkPauseMs));
     if (uploadThread && uploadThread->Start()) return true;
   }
   uploadThread.reset();

@@ -7,6 +7,7 @@
 
 #include "support/recording_listener.h"
 #include "support/temp_folder.h"
+#include "transport/ChunkPause.h"
 #include "transport/UploadRequest.h"
 #include "transport/UploadResult.h"
 #include "transport/UploadStatus.h"
@@ -27,7 +28,9 @@ constexpr std::size_t kHeaderSizeBelow = 1024;  // pieces this small are part he
 class UploadEngine : public test_support::TempFolderTest {
  protected:
   win::Status Upload() {
-    Uploader uploader(&listener_, &request_, &result_, server_.Environment());
+    UploadEnvironment environment = server_.Environment();
+    environment.pauseAfterChunkMs = pauseMs_;
+    Uploader uploader(&listener_, &request_, &result_, std::move(environment));
     const win::Status status = uploader.Upload();
     reply_ = uploader.reply;
     return status;
@@ -54,6 +57,7 @@ class UploadEngine : public test_support::TempFolderTest {
   RecordingListener listener_;
   FakeServer server_;
   std::string reply_;
+  std::uint32_t pauseMs_ = ChunkPause::kDefaultMs;
 };
 
 TEST_F(UploadEngine, FastWritesGrowTheChunkToSixteenMebibytesWhereItStays) {
@@ -79,24 +83,68 @@ TEST_F(UploadEngine, SlowWritesHalveTheChunkDownToItsFloor) {
   EXPECT_EQ(ChunkSizes(), expected);
 }
 
-// Writes of 300 ms plus the 50 ms pause from t = 1000 ms: the half-second number
-// is 2 at the start, still 2 after the first chunk, 3 after the second, 4 after
-// the third. The final event repeats the last estimates.
-TEST_F(UploadEngine, ProgressIsReportedOnlyWhenTheHalfSecondChanges) {
-  ScriptWriteTimes({300, 300, 300});
-  request_.AddFile(L"f", MakeSparseFile(L"f", 224 * KiB).c_str());
+// Three chunks written in 300 ms each from t = 1000 ms, each followed by the pause.
+struct PauseCase {
+  std::uint32_t pauseMs;
+  // Reports after a chunk, then the final one, which repeats the last estimates.
+  std::vector<std::string> laterProgress;
+};
+void PrintTo(const PauseCase& c, std::ostream* out) { *out << c.pauseMs << " ms"; }
+
+class PauseAfterChunk : public UploadEngine, public ::testing::WithParamInterface<PauseCase> {
+ protected:
+  void SetUp() override {
+    UploadEngine::SetUp();
+    pauseMs_ = GetParam().pauseMs;
+    ScriptWriteTimes({300, 300, 300});
+    request_.AddFile(L"f", MakeSparseFile(L"f", 224 * KiB).c_str());
+  }
+};
+
+// Only the write times size the chunks; a report goes out only when the
+// half-second number has changed, so the pause moves the reports.
+TEST_P(PauseAfterChunk, ChunksFollowTheWritesAndReportsTheHalfSecond) {
   ASSERT_EQ(Upload(), win::kOk);
-  EXPECT_EQ(listener_.events, (std::vector<std::string>{
-                                  "FileBegin f",
-                                  "FileProgress f 0 229376 40 0 229376 40 5600",
-                                  "FileProgress f 98304 229376 1 98304 229376 1 98304",
-                                  "FileProgress f 229376 229376 0 229376 229376 0 114688",
-                                  "FileProgress f 229376 229376 0 229376 229376 0 114688",
-                                  "FileComplete f 0x00000000",
-                              }));
-  EXPECT_EQ(request_.rateEstimate, 114688u);
+  const std::uint32_t pause = GetParam().pauseMs;
+  EXPECT_EQ(ChunkSizes(), (std::vector<std::size_t>{32 * KiB, 64 * KiB, 128 * KiB}));
+  EXPECT_EQ(server_.sleeps, (std::vector<std::uint32_t>{pause, pause, pause}));
+  std::vector<std::string> expected = {"FileBegin f",
+                                       "FileProgress f 0 229376 40 0 229376 40 5600"};
+  for (const std::string& values : GetParam().laterProgress) {
+    expected.push_back("FileProgress f " + values);
+  }
+  expected.push_back("FileComplete f 0x00000000");
+  EXPECT_EQ(listener_.events, expected);
   EXPECT_TRUE(server_.ended);
 }
+
+// The third poll comes after the second chunk: no third chunk is read or written.
+TEST_P(PauseAfterChunk, CancelStopsBehindTheChunkJustWritten) {
+  listener_.cancelAt = [](int poll) { return poll == 3; };
+  EXPECT_EQ(Upload(), UPLOAD_E_CANCELLED);
+  EXPECT_EQ(ChunkSizes(), (std::vector<std::size_t>{32 * KiB, 64 * KiB}));
+  EXPECT_EQ(server_.sleeps.size(), 2u);
+  EXPECT_EQ(listener_.events.back(), "FileComplete f 0x80040301");
+  EXPECT_FALSE(server_.ended);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Pauses, PauseAfterChunk,
+    ::testing::Values(PauseCase{0,
+                                {"98304 229376 1 98304 229376 1 98304",
+                                 "229376 229376 1 229376 229376 1 98304"}},
+                      PauseCase{50,
+                                {"98304 229376 1 98304 229376 1 98304",
+                                 "229376 229376 0 229376 229376 0 114688",
+                                 "229376 229376 0 229376 229376 0 114688"}},
+                      PauseCase{1000,
+                                {"32768 229376 12 32768 229376 12 16384",
+                                 "98304 229376 6 98304 229376 6 19660",
+                                 "229376 229376 0 229376 229376 0 32768",
+                                 "229376 229376 0 229376 229376 0 32768"}}),
+    [](const ::testing::TestParamInfo<PauseCase>& info) {
+      return std::to_string(info.param.pauseMs) + "ms";
+    });
 
 TEST_F(UploadEngine, TheLastMeasuredSpeedStartsTheNextFileAndTheNextUpload) {
   ScriptWriteTimes({300, 300, 300});

@@ -28,6 +28,7 @@ struct FakeServer {
   std::uint32_t announced = 0;
   std::vector<std::string> writes;
   bool ended = false;
+  std::vector<std::uint32_t> sleeps;  // milliseconds of each
 
   std::string Body() const {
     std::string body;
@@ -79,7 +80,10 @@ class FakeConnection : public UploadConnection {
 inline UploadEnvironment FakeServer::Environment() {
   return UploadEnvironment{
       [this] { return now; },
-      [this](std::uint32_t ms) { now += ms; },
+      [this](std::uint32_t ms) {
+        sleeps.push_back(ms);
+        now += ms;
+      },
       [this](const UploadRequest&, UploadProgress*, std::unique_ptr<UploadConnection>* out) {
         *out = std::make_unique<FakeConnection>(*this);
         return win::kOk;
