@@ -18,7 +18,7 @@ import tempfile
 import time
 
 import bench_support as bs
-from refservice import RefService, SERVER_HOST
+from fixtures import RefService, SERVER_HOST
 
 UPLOAD_PATH = '/servlet/uploadTemplate'
 UPLOAD_URL = 'http://%s%s' % (SERVER_HOST, UPLOAD_PATH)

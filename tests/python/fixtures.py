@@ -1,0 +1,382 @@
+"""Fixtures of the Python suites, which run inside tests/sandbox/run: the
+reference service's control interface, fresh interpreters, the debug trace,
+a look inside pointer objects, a session and an upload per test.
+
+Replies (see reply()) may also set: delay (seconds before answering), pieces
+and pause, chunked, no_length, close_after (bytes, then close), hang,
+read_rate (request bytes per second), abort_after (body bytes, then drop) and
+raw_b64 (bytes sent instead of a reply). Host states: 'up', 'down', 'hang'.
+Certificates: 'good', 'expired', 'wrong-name'. reset() restores them all.
+"""
+import base64
+import ctypes
+import imp
+import json
+import os
+import shutil
+import stat
+import subprocess
+import sys
+import tempfile
+import textwrap
+import thread
+import threading
+import time
+import unittest
+import urllib2
+
+import _PyUploader as native
+from PyUploader import PyPresetUploader
+
+_HOSTS = imp.load_source('_refservice_hosts', os.path.join(
+    os.path.dirname(os.path.abspath(__file__)), '..', 'service', 'hosts.py'))
+DEFAULT_HOST, STAGING_HOST = _HOSTS.DEFAULT_HOST, _HOSTS.STAGING_HOST
+DETECTION_HOST, SERVER_HOST = _HOSTS.DETECTION_HOST, _HOSTS.SERVER_HOST
+MAIN_THREAD = thread.get_ident()
+UUID = u'machine-1'
+
+
+def reply(body=None, status=None, headers=None, **options):
+    """A scripted reply; body is sent byte for byte (unicode as UTF-8)."""
+    scripted = dict(options)
+    if body is not None:
+        body = body.encode('utf-8') if isinstance(body, unicode) else body
+        scripted.update(body_b64=base64.b64encode(body), status=200)
+    if status is not None:
+        scripted['status'] = status
+    if headers is not None:
+        scripted['headers'] = headers
+    return scripted
+
+
+def xml_reply(xml, status=200, **options):
+    return reply(xml, status, [['Content-Type', 'text/xml; charset=UTF-8']], **options)
+
+
+def raw(data):
+    return reply(raw_b64=base64.b64encode(data))
+
+
+class Recorded(object):
+    """A recorded request (method, target, path, head, body, body_size,
+    complete, host, port, tls, seq, upload) or multipart part (kind, name,
+    filename, content_type, size, sha256, content)."""
+
+    def __init__(self, document):
+        for key, value in document.items():
+            setattr(self, str(key), _decode(value))
+        upload = getattr(self, 'upload', None)
+        if isinstance(upload, dict):
+            self.upload = Recorded(upload)
+            self.upload.parts = [Recorded(p) for p in upload['parts']]
+            self.upload.fields = [(p.name, p.content) for p in self.upload.parts
+                                  if p.kind == 'field']
+            self.upload.files = [p for p in self.upload.parts if p.kind == 'file']
+
+    def header(self, name):
+        return dict((k.lower(), v) for k, v in self.headers).get(name.lower())
+
+
+def _decode(value):
+    if isinstance(value, dict):
+        if value.keys() == ['base64']:
+            return base64.b64decode(value['base64'])
+        return dict((k, _decode(v)) for k, v in value.items())
+    if isinstance(value, list):
+        return [_decode(v) for v in value]
+    return value
+
+
+class RefService(object):
+    url = os.environ.get('REFSERVICE_CONTROL', _HOSTS.CONTROL_URL)
+
+    def reset(self):
+        self._call('/reset', {})
+
+    def script(self, host, path, replies, repeat=False):
+        self._call('/script', dict(host=host, path=path, replies=list(replies), repeat=repeat))
+
+    def host_state(self, host, state):
+        self._call('/host', dict(host=host, state=state))
+
+    def tls(self, cert):
+        self._call('/tls', dict(cert=cert))
+
+    def requests(self, host=None, path=None, bodies=True):
+        pairs = [(k, v) for k, v in (('bodies', None if bodies else '0'), ('host', host),
+                                      ('path', path)) if v]
+        query = '&'.join('%s=%s' % (k, urllib2.quote(v, safe='')) for k, v in pairs)
+        return [Recorded(r) for r in self._call('/requests?' + query)['requests']]
+
+    def _call(self, path, body=None):
+        data = json.dumps(body) if body is not None else None
+        request = urllib2.Request(self.url + path, data, {'Content-Type': 'application/json'})
+        try:
+            return json.loads(urllib2.urlopen(request, timeout=30).read())
+        except urllib2.HTTPError as error:
+            raise AssertionError('control %s: %s' % (path, error.read()))
+
+
+def wait_until(condition, timeout=10.0, what='the condition'):
+    """Polls condition() until it is true and returns its value; fails after timeout."""
+    deadline = time.time() + timeout
+    while True:
+        value = condition()
+        if value:
+            return value
+        if time.time() > deadline:
+            raise AssertionError('no %s after %.1f s' % (what, timeout))
+        time.sleep(0.02)
+
+
+def run_python(code, env=None):
+    """Runs code in a fresh interpreter; returns (exit code, stdout, stderr)."""
+    proc = subprocess.Popen([sys.executable, '-c', textwrap.dedent(code)], env=env,
+                            stdout=subprocess.PIPE, stderr=subprocess.PIPE)
+    out, err = proc.communicate()
+    return proc.returncode, out, err
+
+
+class Trace(object):
+    """A registry hive with the trace switch on and an output file, in a
+    temporary folder named by the environment while the object lives."""
+    HIVE = (u'Windows Registry Editor Version 5.00\r\n\r\n'
+            u'[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n"DumpMsg"=dword:00000001\r\n')
+
+    def __init__(self):
+        self.folder = tempfile.mkdtemp(prefix='trace-')
+        self.output = os.path.join(self.folder, 'debug.log')
+        hive = os.path.join(self.folder, 'registry.reg')
+        with open(hive, 'wb') as out:
+            out.write(self.HIVE.encode('ascii'))
+        self.saved = dict(os.environ)
+        os.environ.update(PYUPLOADER_REGISTRY=hive, PYUPLOADER_DEBUG_OUTPUT=self.output)
+
+    def close(self):
+        os.environ.clear()
+        os.environ.update(self.saved)
+        shutil.rmtree(self.folder, ignore_errors=True)
+
+    def clear(self):
+        if os.path.exists(self.output):
+            os.remove(self.output)
+
+    def lines(self, prefix=u'[OBLoginData]'):
+        """The lines written, each checked for the prefix and shown without it."""
+        if not os.path.exists(self.output):
+            return []
+        with open(self.output, 'rb') as written:
+            lines = written.read().decode('utf-8').splitlines()
+        for line in lines:
+            assert line.startswith(prefix), line
+        return [line[len(prefix):] for line in lines]
+
+
+class Ticker(object):
+    """Counts in a Python thread while the main thread is busy: it only
+    advances while the interpreter lock is free."""
+
+    def __init__(self):
+        self.ticks = 0
+        self._stop = threading.Event()
+        self._thread = threading.Thread(target=self._run)
+
+    def __enter__(self):
+        self._thread.start()
+        return self
+
+    def __exit__(self, *exc):
+        self._stop.set()
+        self._thread.join()
+
+    def _run(self):
+        while not self._stop.is_set():
+            self.ticks += 1
+            time.sleep(0.01)
+
+
+# Pointer objects have a fixed layout (other modules read it too): after the
+# object header come the address, the type and the ownership flag.
+_PTR = 2 * ctypes.sizeof(ctypes.c_void_p)
+
+
+def address_of(pointer_object):
+    return ctypes.c_void_p.from_address(id(pointer_object) + _PTR).value or 0
+
+
+def cell_value(pointer_object):
+    """The pointer-sized value that a pointer object points at (a handle cell)."""
+    return ctypes.c_void_p.from_address(address_of(pointer_object)).value or 0
+
+
+class Relocated(object):
+    """A pointer object shown at another address for a with block."""
+
+    def __init__(self, pointer_object, address):
+        self.cell = ctypes.c_void_p.from_address(id(pointer_object) + _PTR)
+        self.address = address
+
+    def __enter__(self):
+        self.saved, self.cell.value = self.cell.value, self.address
+
+    def __exit__(self, *exc):
+        self.cell.value = self.saved
+
+
+class Test(unittest.TestCase):
+    """A reset service and the debug trace on, for every test."""
+
+    def setUp(self):
+        self.svc = RefService()
+        self.svc.reset()
+        self.trace = Trace()
+        self.addCleanup(self.trace.close)
+
+    def assertRaisesText(self, error, text, function, *args):
+        with self.assertRaises(error) as caught:
+            function(*args)
+        self.assertEqual(str(caught.exception), text)
+
+
+BROWSER = '#!/bin/sh\nprintf "%s\\n" "$1" >> "$0.links"\n'
+
+
+class SessionTest(Test):
+    """A new session; links handed to a browser are written down."""
+
+    def setUp(self):
+        Test.setUp(self)
+        self.browser = os.path.join(self.trace.folder, 'browser')
+        with open(self.browser, 'wb') as out:
+            out.write(BROWSER)
+        os.chmod(self.browser, stat.S_IRWXU)
+        os.environ['BROWSER'] = self.browser
+        self.session = None
+        self.new_session()
+        self.addCleanup(lambda: native.delete_OBLoginData(self.session))
+
+    def new_session(self, version=u'5.0', version_type=u'Retail'):
+        native.delete_OBLoginData(self.session)
+        self.session = native.new_OBLoginData(version, version_type, UUID)
+        self.trace.clear()  # the constructor's version lines are not the subject
+
+    def call(self, operation, *args):
+        return getattr(native, 'OBLoginData_' + operation)(self.session, *args)
+
+    def sign_in(self, reset=True):
+        self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
+        if reset:
+            self.svc.reset()  # later assertions see only the operation's requests
+            self.trace.clear()
+
+    def sent(self, path, host=SERVER_HOST):
+        return self.svc.requests(host=host, path=path)
+
+    def opened_links(self):
+        record = self.browser + '.links'
+        wait_until(lambda: os.path.exists(record), 10.0, 'opened link')
+        with open(record) as opened:
+            return opened.read().splitlines()
+
+
+UPLOAD_PATH = '/servlet/uploadTemplate'
+SESSION = (u'api.orbishare.com', u'0123456789abcdef01234567', u'5.0', u'Retail', u'uuid-1')
+TEXTS = (u'golden-hour', u'Golden h\xf6ur', u'7', u'warm,sunset', u'Soft "warm"\r\nlight')
+
+
+class PresetFiles(object):
+    """A preset file and twelve images of random bytes in a temporary folder."""
+
+    def __init__(self, preset_size=3000, image_sizes=None, prefix=u'preset-\xe9-'):
+        self.folder = tempfile.mkdtemp(prefix=prefix)
+        sizes = image_sizes or [1000 + 77 * i for i in range(12)]
+        self.preset = self.write(u'Golden hour.preset', preset_size)
+        self.images = [self.write(u'preview_%02d.png' % (i + 1), n) for i, n in enumerate(sizes)]
+
+    def write(self, name, size):
+        path = os.path.join(self.folder, name)
+        with open(path, 'wb') as out:
+            out.write(os.urandom(size))
+        return path
+
+    def parts(self):
+        """(field name, path) of the fourteen file parts, in wire order."""
+        names = ['PIPfile', 'PIPimg'] + ['PIPimg_%d' % (i + 1) for i in range(12)]
+        return zip(names, [self.preset, self.images[0]] + self.images)
+
+    def remove(self):
+        shutil.rmtree(self.folder, ignore_errors=True)
+
+
+class Reports(object):
+    """A callable that keeps every report with the thread that delivered it."""
+
+    def __init__(self, then=None):
+        self.items, self.threads, self.then = [], set(), then
+
+    def __call__(self, *report):
+        self.items.append(report)
+        self.threads.add(thread.get_ident())
+        if self.then:
+            self.then(self, report)
+
+    def progress(self):
+        return [r for r in self.items if r[1] == u'ProgressChanged']
+
+    def completions(self):
+        return [r for r in self.items if r[1] == u'UploadComplete']
+
+
+def pump(seconds):
+    """Lets the main thread take the reports that arrive for a while."""
+    deadline = time.time() + seconds
+    while time.time() < deadline:
+        time.sleep(0.02)
+
+
+def worker_threads():
+    return len(os.listdir('/proc/self/task')) - 1
+
+
+def open_descriptors():
+    return len(os.listdir('/proc/self/fd'))
+
+
+class UploadTest(Test):
+    """Fresh preset files and an uploader with a recording callable."""
+
+    def setUp(self):
+        Test.setUp(self)
+        self.files = PresetFiles()
+        self.addCleanup(lambda: self.files.remove())
+        self.reports = Reports()
+        self.uploader = self.new_uploader()
+        self.addCleanup(lambda: setattr(self, 'uploader', None))
+
+    def new_uploader(self, *session):
+        uploader = PyPresetUploader(*(session or SESSION))
+        uploader.SetCallback(self.reports)
+        return uploader
+
+    def replace_files(self, **options):
+        self.files.remove()
+        self.files = PresetFiles(**options)
+
+    def start(self, uploader=None, files=None, texts=TEXTS):
+        files = files or [self.files.preset] + self.files.images
+        return (uploader or self.uploader).StartUpload(files[0], files[1:], *texts)
+
+    def completion(self, reports=None, timeout=60.0):
+        """Runs Python on the main thread until the completion report arrives."""
+        reports = reports or self.reports
+        return wait_until(reports.completions, timeout, 'completion report')[0]
+
+    def wait_for_progress(self, reports=None):
+        reports = reports or self.reports
+        wait_until(lambda: [r for r in reports.progress() if r[2] > 0], 30.0, 'progress')
+
+    def slow_reader(self, bytes_per_second):
+        self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=bytes_per_second)])
+
+    def uploads(self, bodies=True):
+        return self.svc.requests(host=SERVER_HOST, path=UPLOAD_PATH, bodies=bodies)
