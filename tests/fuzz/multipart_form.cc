@@ -8,8 +8,7 @@
 #include <optional>
 #include <unistd.h>
 
-#include "../unit/support/recording_listener.h"
-#include "../unit/transport/fake_server.h"
+#include "../unit/support/fixtures.h"
 #include "fuzz_support.h"
 #include "transport/UploadRequest.h"
 #include "transport/UploadResult.h"
@@ -165,7 +164,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   Form form;
   FillForm(form, fuzz::Bytes(data, size));
   test_support::FakeServer server;
-  test_support::RecordingListener listener;
+  test_support::RecordingListener<UploadProgress> listener;
   UploadResult result;
   Uploader uploader(&listener, &form.request, &result, server.Environment());
   fuzz::Require(uploader.Upload() == win::kOk, "a form of readable files uploads");

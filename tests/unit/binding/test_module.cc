@@ -3,7 +3,7 @@
 #include "module/runtime/ModuleTypes.h"
 #include "module/runtime/PyRef.h"
 #include "module/runtime/pointers.h"
-#include "support/embedded_python.h"
+#include "support/fixtures.h"
 
 namespace binding_test {
 
@@ -11,6 +11,7 @@ namespace {
 
 binding::ModuleTypes& Types() {
   static auto* types = [] {
+    test_support::StartPython();
     auto* made = new binding::ModuleTypes({
         {"_p_CString", "CString *"},
         {"_p_Thing", "Thing *"},

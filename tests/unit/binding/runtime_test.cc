@@ -1,0 +1,96 @@
+// What only C++ sees of the binding runtime: which foreign types are trusted
+// as pointer objects, packed objects, the ring's type look-up, and copies made
+// before a refusal. What Python sees is in the Python binding suite.
+#include <Python.h>
+#include <gtest/gtest.h>
+
+#include "module/runtime/ModuleTypes.h"
+#include "module/runtime/PySwigObject.h"
+#include "module/runtime/PySwigPacked.h"
+#include "module/runtime/StaticType.h"
+#include "module/runtime/TypeTable.h"
+#include "module/runtime/call.h"
+#include "test_module.h"
+
+namespace {
+
+using namespace binding;
+using binding_test::TestType;
+
+// Another module's static type of that name, size and flags stands behind the object.
+bool Trusted(const char* name, Py_ssize_t size, long flags, bool (*check)(PyObject*)) {
+  PyTypeObject type = StaticType::Template(name, size);
+  type.tp_flags |= flags;
+  PyObject object{};
+  Py_REFCNT(&object) = 1;
+  Py_TYPE(&object) = &type;
+  return check(&object);
+}
+
+TEST(ForeignTypes, OnlyStaticTypesOfTheSameNameAndLayoutAreTrusted) {
+  EXPECT_TRUE(Trusted("PySwigObject", sizeof(PySwigObject), 0, IsPySwigObject));
+  EXPECT_FALSE(Trusted("PySwigObject", sizeof(PyObject), 0, IsPySwigObject));
+  EXPECT_FALSE(Trusted("PySwigObject", sizeof(PySwigObject), Py_TPFLAGS_HEAPTYPE, IsPySwigObject));
+  EXPECT_FALSE(Trusted("PySwigObjects", sizeof(PySwigObject), 0, IsPySwigObject));
+  EXPECT_TRUE(Trusted("PySwigPacked", sizeof(PySwigPacked), 0, IsPySwigPacked));
+  EXPECT_FALSE(Trusted("PySwigPacked", sizeof(PySwigPacked) + 8, 0, IsPySwigPacked));
+  EXPECT_FALSE(Trusted("PySwigPacked", sizeof(PySwigPacked), Py_TPFLAGS_HEAPTYPE, IsPySwigPacked));
+}
+
+std::string Text(PyObject* (*form)(PyObject*), const std::vector<unsigned char>& bytes) {
+  PyRef packed(NewPySwigPacked(bytes.data(), bytes.size(), binding_test::Type(TestType::Thing)));
+  PyRef text(form(packed.get()));
+  return PyString_AsString(text.get());
+}
+
+TEST(PackedObjects, ShowTheirBytesWhileTheyFitAndCompareBySizeThenContent) {
+  EXPECT_EQ(Text(PyObject_Repr, {0x01, 0xab}), "<Swig Packed at _01ab_p_Thing>");
+  EXPECT_EQ(Text(PyObject_Str, {0x01, 0xab}), "_01ab_p_Thing");
+  EXPECT_EQ(Text(PyObject_Str, std::vector<unsigned char>(511, 0x5a)).size(), 1 + 1022 + 8u);
+  EXPECT_EQ(Text(PyObject_Repr, std::vector<unsigned char>(512, 0x5a)), "<Swig Packed _p_Thing>");
+  EXPECT_EQ(Text(PyObject_Str, std::vector<unsigned char>(512, 0x5a)), "_p_Thing");
+  TypeInfo* type = binding_test::Type(TestType::Thing);
+  const unsigned char a[] = {1, 2}, b[] = {1, 3}, c[] = {0, 0, 0};
+  PyRef pa(NewPySwigPacked(a, 2, type)), pb(NewPySwigPacked(b, 2, type)), pc(NewPySwigPacked(c, 3, type)),
+      again(NewPySwigPacked(a, 2, type));
+  EXPECT_EQ((std::vector{PyObject_Compare(pa.get(), pb.get()), PyObject_Compare(pb.get(), pa.get()),
+                         PyObject_Compare(pb.get(), pc.get()), PyObject_Compare(pa.get(), again.get())}),
+            (std::vector{-1, 1, -1, 0}));
+}
+
+// Two more modules join the ring: one TypeInfo per name, found by mangled name
+// or by any of its spellings, shown by its last spelling.
+TEST(Ring, ANameHasOneTypeInfoFoundByNameOrSpelling) {
+  binding_test::Type(TestType::Thing);  // the test module is the ring's head
+  static ModuleTypes first({{"_p_Gadget", "Gadget *"}, {"_p_Thing", "Thing *"}});
+  static ModuleTypes second({{"_p_Gadget", "Gadget *"}, {"_p_unsigned_long", "unsigned long *"}});
+  InitializeTypeTable(first.table());
+  InitializeTypeTable(second.table());
+  InitializeTypeTable(first.table());  // joining again changes nothing
+  EXPECT_EQ(first[1], binding_test::Type(TestType::Thing));
+  EXPECT_EQ(second[0], first[0]);
+  for (const auto& [name, expected] : std::vector<std::pair<const char*, TypeInfo*>>{
+           {"_p_Gadget", first[0]}, {"unsigned long*", second[1]}, {" unsigned  long * ", second[1]},
+           {"TCHAR *", binding_test::Type(TestType::Char)}, {"WCHAR*", binding_test::Type(TestType::WChar)},
+           {"_p_nothing", nullptr}, {"char", nullptr}, {"", nullptr}}) {
+    EXPECT_EQ(TypeQuery(name), expected) << name;
+  }
+  EXPECT_STREQ(DisplayName(*binding_test::Type(TestType::WChar)), "WCHAR *");
+}
+
+// Only meaningful under the leak checker (CI's sanitizer run), which would
+// report a wide-string copy left behind by a refused call.
+PyObject* Kinds(PyObject*, PyObject* args) {
+  return Call(args, "kinds", ReturnsInt{}, [](const wchar_t*, int) { return 0; }, WideString(),
+              Integer("int"));
+}
+
+TEST(CallSequence, CopiesMadeBeforeARefusalAreFreed) {
+  PyRef args(Py_BuildValue("(us)", L"copied copied copied copied copied", "not an int"));
+  for (int i = 0; i < 100; ++i) {
+    EXPECT_EQ(Kinds(nullptr, args.get()), nullptr);
+    EXPECT_EQ(binding_test::TakeError(), "TypeError: in method 'kinds', argument 2 of type 'int'");
+  }
+}
+
+}  // namespace
