@@ -1,12 +1,11 @@
 """Fixtures of the Python suites, which run inside tests/sandbox/run: the
-reference service's control interface, fresh interpreters, the debug trace,
-a look inside pointer objects, a session and an upload per test.
+reference service's control interface, the debug trace, pointer objects seen
+through their fixed layout, and a session or an upload per test.
 
-Replies (see reply()) may also set: delay (seconds before answering), pieces
-and pause, chunked, no_length, close_after (bytes, then close), hang,
-read_rate (request bytes per second), abort_after (body bytes, then drop) and
-raw_b64 (bytes sent instead of a reply). Host states: 'up', 'down', 'hang'.
-Certificates: 'good', 'expired', 'wrong-name'. reset() restores them all.
+Replies (reply()) may also set: delay (seconds), pieces and pause, chunked,
+no_length, close_after (bytes, then close), hang, read_rate (request bytes per
+second), abort_after (body bytes, then drop) and raw_b64 (instead of a reply).
+Host states: 'up', 'down', 'hang'. Certificates: 'good', 'expired', 'wrong-name'.
 """
 import base64
 import ctypes
@@ -14,7 +13,6 @@ import imp
 import json
 import os
 import shutil
-import stat
 import subprocess
 import sys
 import tempfile
@@ -28,25 +26,21 @@ import urllib2
 import _PyUploader as native
 from PyUploader import PyPresetUploader
 
-_HOSTS = imp.load_source('_refservice_hosts', os.path.join(
-    os.path.dirname(os.path.abspath(__file__)), '..', 'service', 'hosts.py'))
+_HOSTS = imp.load_source('_hosts', os.path.join(os.path.dirname(__file__), '..', 'service', 'hosts.py'))
 DEFAULT_HOST, STAGING_HOST = _HOSTS.DEFAULT_HOST, _HOSTS.STAGING_HOST
 DETECTION_HOST, SERVER_HOST = _HOSTS.DETECTION_HOST, _HOSTS.SERVER_HOST
 MAIN_THREAD = thread.get_ident()
 UUID = u'machine-1'
+UPLOAD_PATH = '/servlet/uploadTemplate'
 
 
 def reply(body=None, status=None, headers=None, **options):
     """A scripted reply; body is sent byte for byte (unicode as UTF-8)."""
-    scripted = dict(options)
     if body is not None:
         body = body.encode('utf-8') if isinstance(body, unicode) else body
-        scripted.update(body_b64=base64.b64encode(body), status=200)
-    if status is not None:
-        scripted['status'] = status
-    if headers is not None:
-        scripted['headers'] = headers
-    return scripted
+        options.update(body_b64=base64.b64encode(body), status=200)
+    options.update((k, v) for k, v in (('status', status), ('headers', headers)) if v is not None)
+    return options
 
 
 def xml_reply(xml, status=200, **options):
@@ -57,34 +51,30 @@ def raw(data):
     return reply(raw_b64=base64.b64encode(data))
 
 
-class Recorded(object):
-    """A recorded request (method, target, path, head, body, body_size,
-    complete, host, port, tls, seq, upload) or multipart part (kind, name,
-    filename, content_type, size, sha256, content)."""
-
-    def __init__(self, document):
-        for key, value in document.items():
-            setattr(self, str(key), _decode(value))
-        upload = getattr(self, 'upload', None)
-        if isinstance(upload, dict):
-            self.upload = Recorded(upload)
-            self.upload.parts = [Recorded(p) for p in upload['parts']]
-            self.upload.fields = [(p.name, p.content) for p in self.upload.parts
-                                  if p.kind == 'field']
-            self.upload.files = [p for p in self.upload.parts if p.kind == 'file']
-
-    def header(self, name):
-        return dict((k.lower(), v) for k, v in self.headers).get(name.lower())
-
-
 def _decode(value):
     if isinstance(value, dict):
         if value.keys() == ['base64']:
             return base64.b64decode(value['base64'])
         return dict((k, _decode(v)) for k, v in value.items())
-    if isinstance(value, list):
-        return [_decode(v) for v in value]
-    return value
+    return [_decode(v) for v in value] if isinstance(value, list) else value
+
+
+class Recorded(object):
+    """A recorded request (method, target, path, head, headers, body, body_size,
+    complete, host, port, tls, upload) or part of its multipart body (kind, name,
+    filename, content_type, size, sha256, content)."""
+
+    def __init__(self, document):
+        for key, value in document.items():
+            setattr(self, str(key), _decode(value))
+        if isinstance(getattr(self, 'upload', None), dict):
+            self.upload = Recorded(self.upload)
+            self.upload.parts = [Recorded(p) for p in self.upload.parts]
+            self.upload.fields = [(p.name, p.content) for p in self.upload.parts if p.kind == 'field']
+            self.upload.files = [p for p in self.upload.parts if p.kind == 'file']
+
+    def header(self, name):
+        return dict((k.lower(), v) for k, v in self.headers).get(name.lower())
 
 
 class RefService(object):
@@ -103,9 +93,8 @@ class RefService(object):
         self._call('/tls', dict(cert=cert))
 
     def requests(self, host=None, path=None, bodies=True):
-        pairs = [(k, v) for k, v in (('bodies', None if bodies else '0'), ('host', host),
-                                      ('path', path)) if v]
-        query = '&'.join('%s=%s' % (k, urllib2.quote(v, safe='')) for k, v in pairs)
+        query = [(k, v) for k, v in (('bodies', None if bodies else '0'), ('host', host), ('path', path)) if v]
+        query = '&'.join('%s=%s' % (k, urllib2.quote(v, safe='')) for k, v in query)
         return [Recorded(r) for r in self._call('/requests?' + query)['requests']]
 
     def _call(self, path, body=None):
@@ -120,68 +109,38 @@ class RefService(object):
 def wait_until(condition, timeout=10.0, what='the condition'):
     """Polls condition() until it is true and returns its value; fails after timeout."""
     deadline = time.time() + timeout
-    while True:
-        value = condition()
-        if value:
-            return value
+    while not condition():
         if time.time() > deadline:
             raise AssertionError('no %s after %.1f s' % (what, timeout))
         time.sleep(0.02)
+    return condition()
 
 
-def run_python(code, env=None):
+def pump(seconds):
+    """Lets the main thread take the reports that arrive for a while."""
+    deadline = time.time() + seconds
+    while time.time() < deadline:
+        time.sleep(0.02)
+
+
+def run_python(code):
     """Runs code in a fresh interpreter; returns (exit code, stdout, stderr)."""
-    proc = subprocess.Popen([sys.executable, '-c', textwrap.dedent(code)], env=env,
-                            stdout=subprocess.PIPE, stderr=subprocess.PIPE)
+    proc = subprocess.Popen([sys.executable, '-c', textwrap.dedent(code)], stdout=subprocess.PIPE,
+                            stderr=subprocess.PIPE)
     out, err = proc.communicate()
     return proc.returncode, out, err
 
 
-class Trace(object):
-    """A registry hive with the trace switch on and an output file, in a
-    temporary folder named by the environment while the object lives."""
-    HIVE = (u'Windows Registry Editor Version 5.00\r\n\r\n'
-            u'[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n"DumpMsg"=dword:00000001\r\n')
-
-    def __init__(self):
-        self.folder = tempfile.mkdtemp(prefix='trace-')
-        self.output = os.path.join(self.folder, 'debug.log')
-        hive = os.path.join(self.folder, 'registry.reg')
-        with open(hive, 'wb') as out:
-            out.write(self.HIVE.encode('ascii'))
-        self.saved = dict(os.environ)
-        os.environ.update(PYUPLOADER_REGISTRY=hive, PYUPLOADER_DEBUG_OUTPUT=self.output)
-
-    def close(self):
-        os.environ.clear()
-        os.environ.update(self.saved)
-        shutil.rmtree(self.folder, ignore_errors=True)
-
-    def clear(self):
-        if os.path.exists(self.output):
-            os.remove(self.output)
-
-    def lines(self, prefix=u'[OBLoginData]'):
-        """The lines written, each checked for the prefix and shown without it."""
-        if not os.path.exists(self.output):
-            return []
-        with open(self.output, 'rb') as written:
-            lines = written.read().decode('utf-8').splitlines()
-        for line in lines:
-            assert line.startswith(prefix), line
-        return [line[len(prefix):] for line in lines]
+def threads_and_descriptors():
+    return len(os.listdir('/proc/self/task')), len(os.listdir('/proc/self/fd'))
 
 
 class Ticker(object):
-    """Counts in a Python thread while the main thread is busy: it only
-    advances while the interpreter lock is free."""
-
-    def __init__(self):
-        self.ticks = 0
-        self._stop = threading.Event()
-        self._thread = threading.Thread(target=self._run)
+    """Counts in a Python thread, which only advances while the interpreter lock is free."""
 
     def __enter__(self):
+        self.ticks, self._stop = 0, threading.Event()
+        self._thread = threading.Thread(target=self._run)
         self._thread.start()
         return self
 
@@ -195,8 +154,7 @@ class Ticker(object):
             time.sleep(0.01)
 
 
-# Pointer objects have a fixed layout (other modules read it too): after the
-# object header come the address, the type and the ownership flag.
+# A pointer object holds, after the object header, the address, the type and the ownership flag.
 _PTR = 2 * ctypes.sizeof(ctypes.c_void_p)
 
 
@@ -204,17 +162,16 @@ def address_of(pointer_object):
     return ctypes.c_void_p.from_address(id(pointer_object) + _PTR).value or 0
 
 
-def cell_value(pointer_object):
-    """The pointer-sized value that a pointer object points at (a handle cell)."""
-    return ctypes.c_void_p.from_address(address_of(pointer_object)).value or 0
+def cell(pointer_object):
+    """The pointer-sized cell that a pointer object points at (a handle)."""
+    return ctypes.c_void_p.from_address(address_of(pointer_object))
 
 
 class Relocated(object):
     """A pointer object shown at another address for a with block."""
 
     def __init__(self, pointer_object, address):
-        self.cell = ctypes.c_void_p.from_address(id(pointer_object) + _PTR)
-        self.address = address
+        self.cell, self.address = ctypes.c_void_p.from_address(id(pointer_object) + _PTR), address
 
     def __enter__(self):
         self.saved, self.cell.value = self.cell.value, self.address
@@ -224,21 +181,36 @@ class Relocated(object):
 
 
 class Test(unittest.TestCase):
-    """A reset service and the debug trace on, for every test."""
+    """A reset service and the debug trace switched on in a hive and an output
+    file of a temporary folder, which the environment names."""
+    HIVE = ('Windows Registry Editor Version 5.00\r\n\r\n[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\'
+            'Lumivanta]\r\n"DumpMsg"=dword:00000001\r\n')
 
     def setUp(self):
         self.svc = RefService()
         self.svc.reset()
-        self.trace = Trace()
-        self.addCleanup(self.trace.close)
+        self.folder = tempfile.mkdtemp(prefix='trace-')
+        self.addCleanup(shutil.rmtree, self.folder, True)
+        self.trace_file = os.path.join(self.folder, 'debug.log')
+        with open(os.path.join(self.folder, 'hive.reg'), 'wb') as hive:
+            hive.write(self.HIVE)
+        saved = dict(os.environ)
+        self.addCleanup(lambda: (os.environ.clear(), os.environ.update(saved)))
+        os.environ.update(PYUPLOADER_REGISTRY=os.path.join(self.folder, 'hive.reg'),
+                          PYUPLOADER_DEBUG_OUTPUT=self.trace_file)
 
-    def assertRaisesText(self, error, text, function, *args):
-        with self.assertRaises(error) as caught:
-            function(*args)
-        self.assertEqual(str(caught.exception), text)
+    def clear_trace(self):
+        if os.path.exists(self.trace_file):
+            os.remove(self.trace_file)
 
-
-BROWSER = '#!/bin/sh\nprintf "%s\\n" "$1" >> "$0.links"\n'
+    def trace(self, prefix=u'[OBLoginData]'):
+        """The lines written, each checked for the prefix and shown without it."""
+        if not os.path.exists(self.trace_file):
+            return []
+        with open(self.trace_file, 'rb') as written:
+            lines = written.read().decode('utf-8').splitlines()
+        self.assertEqual([l[:len(prefix)] for l in lines], [prefix] * len(lines))
+        return [line[len(prefix):] for line in lines]
 
 
 class SessionTest(Test):
@@ -246,10 +218,10 @@ class SessionTest(Test):
 
     def setUp(self):
         Test.setUp(self)
-        self.browser = os.path.join(self.trace.folder, 'browser')
+        self.browser = os.path.join(self.folder, 'browser')
         with open(self.browser, 'wb') as out:
-            out.write(BROWSER)
-        os.chmod(self.browser, stat.S_IRWXU)
+            out.write('#!/bin/sh\nprintf "%s\\n" "$1" >> "$0.links"\n')
+        os.chmod(self.browser, 0o700)
         os.environ['BROWSER'] = self.browser
         self.session = None
         self.new_session()
@@ -258,54 +230,27 @@ class SessionTest(Test):
     def new_session(self, version=u'5.0', version_type=u'Retail'):
         native.delete_OBLoginData(self.session)
         self.session = native.new_OBLoginData(version, version_type, UUID)
-        self.trace.clear()  # the constructor's version lines are not the subject
+        self.clear_trace()  # the constructor's version lines are not the subject
 
     def call(self, operation, *args):
         return getattr(native, 'OBLoginData_' + operation)(self.session, *args)
 
-    def sign_in(self, reset=True):
+    def sign_in(self):
         self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
-        if reset:
-            self.svc.reset()  # later assertions see only the operation's requests
-            self.trace.clear()
+        self.svc.reset()  # later assertions see only the operation's requests
+        self.clear_trace()
 
     def sent(self, path, host=SERVER_HOST):
         return self.svc.requests(host=host, path=path)
 
     def opened_links(self):
-        record = self.browser + '.links'
-        wait_until(lambda: os.path.exists(record), 10.0, 'opened link')
-        with open(record) as opened:
+        wait_until(lambda: os.path.exists(self.browser + '.links'), 10.0, 'opened link')
+        with open(self.browser + '.links') as opened:
             return opened.read().splitlines()
 
 
-UPLOAD_PATH = '/servlet/uploadTemplate'
 SESSION = (u'api.orbishare.com', u'0123456789abcdef01234567', u'5.0', u'Retail', u'uuid-1')
 TEXTS = (u'golden-hour', u'Golden h\xf6ur', u'7', u'warm,sunset', u'Soft "warm"\r\nlight')
-
-
-class PresetFiles(object):
-    """A preset file and twelve images of random bytes in a temporary folder."""
-
-    def __init__(self, preset_size=3000, image_sizes=None, prefix=u'preset-\xe9-'):
-        self.folder = tempfile.mkdtemp(prefix=prefix)
-        sizes = image_sizes or [1000 + 77 * i for i in range(12)]
-        self.preset = self.write(u'Golden hour.preset', preset_size)
-        self.images = [self.write(u'preview_%02d.png' % (i + 1), n) for i, n in enumerate(sizes)]
-
-    def write(self, name, size):
-        path = os.path.join(self.folder, name)
-        with open(path, 'wb') as out:
-            out.write(os.urandom(size))
-        return path
-
-    def parts(self):
-        """(field name, path) of the fourteen file parts, in wire order."""
-        names = ['PIPfile', 'PIPimg'] + ['PIPimg_%d' % (i + 1) for i in range(12)]
-        return zip(names, [self.preset, self.images[0]] + self.images)
-
-    def remove(self):
-        shutil.rmtree(self.folder, ignore_errors=True)
 
 
 class Reports(object):
@@ -327,49 +272,45 @@ class Reports(object):
         return [r for r in self.items if r[1] == u'UploadComplete']
 
 
-def pump(seconds):
-    """Lets the main thread take the reports that arrive for a while."""
-    deadline = time.time() + seconds
-    while time.time() < deadline:
-        time.sleep(0.02)
-
-
-def worker_threads():
-    return len(os.listdir('/proc/self/task')) - 1
-
-
-def open_descriptors():
-    return len(os.listdir('/proc/self/fd'))
-
-
 class UploadTest(Test):
-    """Fresh preset files and an uploader with a recording callable."""
+    """A preset file and twelve images of random bytes, and an uploader with a
+    recording callable."""
 
     def setUp(self):
         Test.setUp(self)
-        self.files = PresetFiles()
-        self.addCleanup(lambda: self.files.remove())
+        self.replace_files()
         self.reports = Reports()
         self.uploader = self.new_uploader()
         self.addCleanup(lambda: setattr(self, 'uploader', None))
+
+    def replace_files(self, preset_size=3000, image_sizes=None, prefix=u'preset-\xe9-'):
+        folder = tempfile.mkdtemp(prefix=prefix, dir=self.folder)
+        self.preset, self.images = None, []
+        for i, size in enumerate([preset_size] + (image_sizes or [1000 + 77 * i for i in range(12)])):
+            path = os.path.join(folder, u'Golden hour.preset' if i == 0 else u'preview_%02d.png' % i)
+            with open(path, 'wb') as out:
+                out.write(os.urandom(size))
+            self.images.append(path)
+        self.preset = self.images.pop(0)
+        self.missing = os.path.join(folder, u'missing.png')
+
+    def parts(self):
+        """(field name, path) of the fourteen file parts, in wire order."""
+        names = ['PIPfile', 'PIPimg'] + ['PIPimg_%d' % (i + 1) for i in range(12)]
+        return zip(names, [self.preset, self.images[0]] + self.images)
 
     def new_uploader(self, *session):
         uploader = PyPresetUploader(*(session or SESSION))
         uploader.SetCallback(self.reports)
         return uploader
 
-    def replace_files(self, **options):
-        self.files.remove()
-        self.files = PresetFiles(**options)
-
     def start(self, uploader=None, files=None, texts=TEXTS):
-        files = files or [self.files.preset] + self.files.images
+        files = files or [self.preset] + self.images
         return (uploader or self.uploader).StartUpload(files[0], files[1:], *texts)
 
     def completion(self, reports=None, timeout=60.0):
         """Runs Python on the main thread until the completion report arrives."""
-        reports = reports or self.reports
-        return wait_until(reports.completions, timeout, 'completion report')[0]
+        return wait_until((reports or self.reports).completions, timeout, 'completion report')[0]
 
     def wait_for_progress(self, reports=None):
         reports = reports or self.reports

@@ -9,7 +9,7 @@ import unittest
 
 import _PyUploader as native
 from fixtures import (DETECTION_HOST, SERVER_HOST, STAGING_HOST, UPLOAD_PATH, UploadTest,
-                      open_descriptors, raw, reply, worker_threads)
+                      raw, reply, threads_and_descriptors)
 
 XML = ['Content-Type', 'text/xml; charset=UTF-8']
 NESTING = 100000
@@ -112,14 +112,14 @@ class FaultyReplies(UploadTest):
         for name, host, path, document, run, failure, carried, signed_in, before in OPERATIONS:
             self.new_session(host == SERVER_HOST, signed_in)
             self.assertNotEqual(run(self), failure, name)
-            held = (open_descriptors(), worker_threads())
+            held = threads_and_descriptors()
             for fault, make_reply, text in FAULTS:
                 self.new_session(host == SERVER_HOST, signed_in)
                 self.svc.script(host, path, [reply()] * before + [make_reply(document)])
                 found = run(self)
                 if found != (failure if text is FAILED else carried(text)):
                     mismatches.append((name, fault, repr(found)[:200]))
-                if (open_descriptors(), worker_threads()) != held:
+                if threads_and_descriptors() != held:
                     mismatches.append((name, fault, 'descriptors or threads left'))
         self.assertEqual(mismatches, [])
 

@@ -11,7 +11,7 @@ import unittest
 import _PyUploader as native
 import _PyUploaderTestPeer as peer
 from fixtures import (DEFAULT_HOST, DETECTION_HOST, SERVER_HOST, STAGING_HOST, UUID, SessionTest,
-                      Ticker, cell_value, reply, xml_reply)
+                      Ticker, cell, reply, xml_reply)
 
 OBSERVER = '/observer.jsp'
 SIGN_IN = '/servlet/memLogin'
@@ -53,7 +53,7 @@ class Discovery(SessionTest):
         fields = dict(APIUrl='api2.example.test', AdjustmentPreset='/presets?x=1', SignUp='/join?a=1',
                       ForgetPassword='/lost?b=2', LensCorrection='/lens?c=3', VideoGallery='/v?d=4')
         self.assertEqual(self.discover(xml_reply(info_xml(**fields))), u'api2.example.test')
-        self.assertEqual(self.trace.lines(), [
+        self.assertEqual(self.trace(), [
             u'KRV SignUp = /join?a=1', u'KRV ForgetPassword = /lost?b=2',
             u'KRV LensCorrection = /lens?c=3', u'KRV VideoGallery = /v?d=4',
             u'Get OB server URL from server. URL = api2.example.test'])
@@ -85,7 +85,7 @@ class Discovery(SessionTest):
         for answer, lines, link in cases:
             self.new_session()
             self.assertEqual(self.discover(answer), unicode(STAGING_HOST))
-            self.assertEqual(self.trace.lines(), lines)
+            self.assertEqual(self.trace(), lines)
             self.assertEqual(self.call('GetSignUpURL'), u'http://%s%s&uuid=%s' % (STAGING_HOST, link, UUID))
 
     def test_an_empty_field_empties_its_link_and_an_absent_one_keeps_the_default(self):
@@ -94,10 +94,21 @@ class Discovery(SessionTest):
         self.assertEqual(self.call('GetForgetPasswordURL'),
                          u'http://%shttp://%s/forgetpwd&uuid=%s' % (SERVER_HOST, DEFAULT_HOST, UUID))
 
+    def test_any_framing_is_read_whole_up_to_16_mib_and_cut_at_the_announced_length(self):
+        # Cut anywhere, the document would not be well-formed and would yield nothing.
+        document = '<INFO><P>%s</P><APIUrl>%s</APIUrl></INFO>' % ('p' * 200000, SERVER_HOST)
+        too_long = info_xml(APIUrl=SERVER_HOST) + ' ' * (16 << 20)
+        for answer, host in [(xml_reply(document, chunked=True, pieces=[1, 7, 100]), SERVER_HOST),
+                             (xml_reply(document, no_length=True, pieces=4, pause=0.05), SERVER_HOST),
+                             (reply(document + '<x', 200, [['Content-Length', str(len(document))]]), SERVER_HOST),
+                             (xml_reply(too_long), STAGING_HOST), (xml_reply(too_long, no_length=True), STAGING_HOST)]:
+            self.new_session()
+            self.assertEqual(self.discover(answer), unicode(host))
+
     def test_a_host_set_by_the_application_skips_detection_until_emptied(self):
         self.call('SetOBURLAsReg', u'my.server.test')
         self.assertEqual(self.discover(), u'my.server.test')
-        self.assertEqual((self.svc.requests(), self.trace.lines()), ([], []))
+        self.assertEqual((self.svc.requests(), self.trace()), ([], []))
         self.call('SetOBURLAsReg', u'')
         self.assertEqual(self.discover(), unicode(SERVER_HOST))
 
@@ -110,7 +121,7 @@ class Discovery(SessionTest):
         self.svc.reset()
         self.svc.host_state(DETECTION_HOST, 'down')
         self.assertEqual(self.discover(), unicode(STAGING_HOST))
-        self.assertEqual((self.trace.lines(), self.call('m_bServerReachable_get')), (FALLBACK, 0))
+        self.assertEqual((self.trace(), self.call('m_bServerReachable_get')), (FALLBACK, 0))
         self.assertEqual(self.svc.requests(), [])
 
     def test_a_probe_url_too_long_for_its_buffer_is_refused_unprobed(self):
@@ -128,15 +139,15 @@ class Discovery(SessionTest):
         self.assertGreaterEqual(elapsed, PROBE_LIMIT - 0.1)
         self.assertLess(elapsed, PROBE_LIMIT + 2.0, 'the cancelled probe did not end')
         self.assertGreater(ticker.ticks, 50, 'other Python threads were held up')
-        handles = [cell_value(self.call(m + '_get')) for m in ('m_hInternet', 'm_hConnect')]
+        handles = [(cell(self.call(m + '_get')).value or 0) for m in ('m_hInternet', 'm_hConnect')]
         self.assertEqual((handles, self.call('m_bServerReachable_get')), ([0, 0], 0))
-        self.assertEqual((self.trace.lines(), self.sent(OBSERVER, DETECTION_HOST)), (FALLBACK, []))
+        self.assertEqual((self.trace(), self.sent(OBSERVER, DETECTION_HOST)), (FALLBACK, []))
 
 
 class SignIn(SessionTest):
 
     def tearDown(self):
-        text = u'\n'.join(self.trace.lines())
+        text = u'\n'.join(self.trace())
         for secret in (ACCOUNT, PASSWORD, TOKEN, u'5econd'):
             self.assertNotIn(secret, text, 'the trace carries a secret')
 
@@ -187,11 +198,11 @@ class SignIn(SessionTest):
                  (info_xml('INFO', tokenid=TOKEN, username='Ann'), u'', None), ('not xml', u'', None)]
         for document, user_name, trace in cases:
             self.call('LogoutOrbishare')
-            self.trace.clear()
+            self.clear_trace()
             self.assertEqual(self.login(ACCOUNT, PASSWORD, xml_reply(document)), 0, document)
             self.assertEqual(self.state(), (u'', user_name), document)
             if trace:
-                self.assertEqual(self.trace.lines()[-1:], trace, document)
+                self.assertEqual(self.trace()[-1:], trace, document)
 
     def test_long_values_are_kept_whole(self):
         token = u't' * 400
@@ -202,13 +213,13 @@ class SignIn(SessionTest):
 
     def test_refusals_before_anything_is_sent_and_refused_certificates(self):
         for account, password in [(u'', PASSWORD), (ACCOUNT, u'')]:
-            self.trace.clear()
+            self.clear_trace()
             self.assertEqual(self.login(account, password), 0)
-            self.assertEqual(self.trace.lines(), [u'Login OB fail: Empty user name or password'])
+            self.assertEqual(self.trace(), [u'Login OB fail: Empty user name or password'])
         self.assertEqual(self.svc.requests(), [])
         self.svc.host_state(DEFAULT_HOST, 'down')
         self.assertEqual(self.login(), 0)
-        self.assertEqual(self.trace.lines()[-1], u'Login OB fail: Can not reach the OB server')
+        self.assertEqual(self.trace()[-1], u'Login OB fail: Can not reach the OB server')
         for certificate in ['expired', 'wrong-name']:
             self.svc.reset()
             self.svc.tls(certificate)
@@ -326,11 +337,11 @@ class RelatedVideo(SessionTest):
 
     def test_the_answers_decide_the_result_and_the_trace_line(self):
         self.assertIsNone(self.relate())
-        self.assertEqual((self.trace.lines(), self.svc.requests()), ([u'SetRelateVideo GetTokenID fail'], []))
+        self.assertEqual((self.trace(), self.svc.requests()), ([u'SetRelateVideo GetTokenID fail'], []))
         self.sign_in()
         answer = xml_reply(u'<info><videoUrl>http://x/\xe9%20</videoUrl></info>')
         self.assertEqual(self.relate(self.ID_REPLY, answer), u'http://x/\xe9%20')
-        self.assertEqual(self.trace.lines(), [])
+        self.assertEqual(self.trace(), [])
         cases = [(xml_reply(u'<info><errMsg>no</errMsg></info>'), None),
                  (reply(''), None), (xml_reply(u'<info><videoUrl></videoUrl></info>'), u''),
                  (xml_reply(u'<INFO><videoUrl>x</videoUrl></INFO>'), None)]
@@ -339,9 +350,9 @@ class RelatedVideo(SessionTest):
         for answer in (xml_reply(u'<info><videoUrl>x</videoUrl></info>'), reply(''),
                        xml_reply(u'<info><videoId></videoId></info>')):
             self.svc.reset()
-            self.trace.clear()
+            self.clear_trace()
             self.assertIsNone(self.relate(answer))
-            self.assertEqual((len(self.sent(VIDEO)), self.trace.lines()),
+            self.assertEqual((len(self.sent(VIDEO)), self.trace()),
                              (1, [u'SetRelateVideo GetVideoID fail']))
         self.svc.host_state(SERVER_HOST, 'down')
         self.assertIsNone(self.relate())

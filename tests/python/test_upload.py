@@ -12,7 +12,7 @@ import urllib
 from StringIO import StringIO
 
 from fixtures import (MAIN_THREAD, SERVER_HOST, SESSION, UPLOAD_PATH, Reports, UploadTest, pump,
-                      reply, wait_until, worker_threads, xml_reply)
+                      reply, threads_and_descriptors, wait_until, xml_reply)
 
 FIRST_URL = u'http://api.orbishare.com/template/view.jsp?id=5001'
 SECOND_URL = u'http://api.orbishare.com/template/view.jsp?id=5002'
@@ -55,8 +55,8 @@ class Publishing(UploadTest):
         self.assertEqual([(f.name, f.filename, f.content_type, (f.size, f.sha256))
                           for f in upload.upload.files],
                          [(name, path.encode('utf-8'), 'application/octet-stream', digest(path))
-                          for name, path in self.files.parts()])
-        self.assertEqual(self.trace.lines(u'[PyPresetUploader]'),
+                          for name, path in self.parts()])
+        self.assertEqual(self.trace(u'[PyPresetUploader]'),
                          [u'PyPresetUploader::OnBackgroundUploadComplete'])
 
     def test_progress_rises_on_the_main_thread_and_a_second_upload_starts_from_the_speed(self):
@@ -93,7 +93,7 @@ class Publishing(UploadTest):
 
     def test_str_texts_and_absent_texts(self):
         self.replace_files(prefix='preset-')
-        paths = [str(p.encode('utf-8')) for p in [self.files.preset] + self.files.images]
+        paths = [str(p.encode('utf-8')) for p in [self.preset] + self.images]
         uploader = self.new_uploader('api.orbishare.com', 'tok', '5.0', None, None)
         self.assertEqual(self.start(uploader, paths, ('k', 'T\\xe9', None, None, '')), 1)
         self.assertEqual(self.completion()[3], 1)
@@ -126,9 +126,9 @@ class ServerAnswers(UploadTest):
         self.assertEqual(self.completion()[2:], FAILED)
         self.assertEqual(self.reports.progress(), [])
         self.svc.reset()
-        for image7 in (self.files.folder + u'/missing.png', None):
+        for image7 in (self.missing, None):
             self.reports.items = []
-            files = [self.files.preset] + self.files.images
+            files = [self.preset] + self.images
             files[7] = image7
             self.assertEqual(self.start(files=files), 1)
             self.assertEqual(self.completion()[2:], FAILED)
@@ -148,8 +148,8 @@ class RefusedStarts(UploadTest):
         self.svc.reset()
         self.reports.items = []
         for index in range(5):
-            for absent in (self.files.folder + u'/missing.png', None):
-                files = [self.files.preset] + self.files.images
+            for absent in (self.missing, None):
+                files = [self.preset] + self.images
                 files[index] = absent
                 self.assertEqual(self.start(files=files), 0, (index, absent))
         longest = u'h' * (259 - len(u'http://') - len(UPLOAD_PATH))
@@ -234,14 +234,14 @@ class Stopping(UploadTest):
         self.assertLess(upload.body_size, 24 * 1024 * 1024)
 
     def test_deleting_waits_for_the_worker_and_lets_go_of_the_callable(self):
-        threads_before = worker_threads()
+        threads_before = threads_and_descriptors()[0]
         references_before = sys.getrefcount(self.reports)
         self.start()
         self.wait_for_progress()
-        self.assertEqual(worker_threads(), threads_before + 1)
+        self.assertEqual(threads_and_descriptors()[0], threads_before + 1)
         count = len(self.reports.items)
         self.uploader = None  # the last reference: the native object goes now
-        self.assertEqual(worker_threads(), threads_before)
+        self.assertEqual(threads_and_descriptors()[0], threads_before)
         pump(QUIET)
         self.assertEqual((len(self.reports.items), self.reports.completions()), (count, []))
         gc.collect()
@@ -249,11 +249,11 @@ class Stopping(UploadTest):
         self.assertFalse(self.uploads(bodies=False)[0].complete)
 
     def test_the_callable_may_delete_the_uploader_it_is_called_by(self):
-        threads_before = worker_threads()
+        threads_before = threads_and_descriptors()[0]
         self.reports.then = lambda reports, report: setattr(self, 'uploader', None)
         self.start()
         wait_until(lambda: self.reports.items, 30.0, 'first report')
-        self.assertEqual(worker_threads(), threads_before)
+        self.assertEqual(threads_and_descriptors()[0], threads_before)
         pump(QUIET)
         self.assertEqual(len(self.reports.items), 1)
 
