@@ -207,17 +207,6 @@ class SessionMembers(Objects):
         verb = '_set' if value else '_get'
         return getattr(native, 'OBLoginData_' + name + verb)(self.session, *value)
 
-    def test_a_new_session_has_empty_texts_and_cleared_probe_members(self):
-        for getter in ('GetUserName', 'GetServerUrl', 'GetLoginTokenID'):
-            value = getattr(native, 'OBLoginData_' + getter)(self.session)
-            self.assertEqual((type(value), value), (unicode, u''), getter)
-        self.assertEqual((native.OBLoginData_GetCategoryCount(self.session),
-                          self.member('m_bServerReachable'), self.member('m_szChkServerUrl')), (0, 0, ''))
-        for name in ('m_hInternet', 'm_hConnect', 'm_hRequest'):
-            handle = self.member(name)
-            self.assertEqual((repr(handle).split(' at ')[0], (cell(handle).value or 0)),
-                             ("<Swig Object of type 'HINTERNET *'", 0), name)
-
     def test_the_url_array_holds_260_bytes_and_refuses_more(self):
         for value, read in [('a' * 100, 'a' * 100), ('b' * MAX_PATH, 'b' * MAX_PATH),
                             ('a\0\0b\0\0', 'a\0\0b'), (None, '')]:
@@ -241,6 +230,7 @@ class SessionMembers(Objects):
         members = ('m_hInternet', 'm_hConnect', 'm_hRequest')
         for number, name in enumerate(members, 1):
             handle = self.member(name)
+            self.assertEqual((repr(handle)[:34], cell(handle).value), ("<Swig Object of type 'HINTERNET *'", None))
             cell(handle).value = 0x1000 * number
             self.member(name, handle)
             cell(handle).value = 0  # the member holds a copy
@@ -290,21 +280,15 @@ class PointerObjects(Objects):
         for made in (first, second, value):
             peer.delete_CString(made)
 
-    def test_instances_proxies_and_chains_of_this_are_accepted_and_others_refused(self):
+    def test_instances_proxies_and_chains_of_this_are_accepted(self):
         class Holder(object):
             def __init__(self, this):
                 self.this = this
-
-        class Empty(object):
-            pass
         record = Holder(self.record)
         for obj in (record, weakref.proxy(record), Holder(Holder(self.record))):
             value = native.infoEffectURL_strTag_get(obj)
             self.assertEqual(peer.CString_value(value), u'text')
             peer.delete_CString(value)
-        for obj in (Empty(), Holder(5)):
-            self.assertRefused(TypeError, "in method 'infoEffectURL_strTag_get', argument 1 of type "
-                               "'infoEffectURL *'", native.infoEffectURL_strTag_get, obj)
 
 
 # Run in a fresh interpreter per import order: registered classes and the ring
@@ -371,16 +355,6 @@ class Process(unittest.TestCase):
                         'import _PyUploader as native\nimport _PyUploaderTestPeer as peer'):
             code, out, err = run_python(SCENARIO % imports)
             self.assertEqual((code, out), (0, EXPECTED), err)
-
-    def test_a_collected_handle_cell_is_reported_as_a_leak(self):
-        code, out, err = run_python("""
-            import _PyUploader as native
-            session = native.new_OBLoginData(u'5.0', u'', u'')
-            native.OBLoginData_m_hConnect_get(session)
-            native.delete_OBLoginData(session)
-            """)
-        self.assertEqual((code, out), (0, "swig/python detected a memory leak of type 'HINTERNET *', "
-                                           "no destructor found.\n"), err)
 
     def test_rounds_of_create_get_set_and_delete_leave_the_process_size_flat(self):
         def resident():

@@ -44,18 +44,6 @@ extern "C" __attribute__((weak, used, visibility("default"))) const char* __lsan
 
 inline void RunPython(const char* code) { ASSERT_EQ(PyRun_SimpleString(code), 0) << code; }
 
-// The repr of a Python expression evaluated in __main__.
-inline std::string EvalRepr(const char* expression) {
-  PyObject* globals = PyModule_GetDict(PyImport_AddModule("__main__"));
-  PyObject* value = PyRun_String(expression, Py_eval_input, globals, globals);
-  PyObject* repr = value ? PyObject_Repr(value) : nullptr;
-  const std::string text = repr ? PyString_AsString(repr) : "<error>";
-  Py_XDECREF(repr);
-  Py_XDECREF(value);
-  PyErr_Clear();
-  return text;
-}
-
 // Sets (or, without a value, unsets) an environment variable for its lifetime.
 class ScopedEnv {
  public:
@@ -70,13 +58,10 @@ class ScopedEnv {
   std::optional<std::string> old_;
 };
 
-inline std::filesystem::path Native(const std::wstring& name) {
-  return std::filesystem::u8path(text::WideToUtf8(name));
-}
+inline std::filesystem::path Native(const std::wstring& name) { return std::filesystem::u8path(text::WideToUtf8(name)); }
 
 inline std::wstring MakeFile(const std::wstring& name, const std::string& bytes) {
-  std::ofstream(Native(name), std::ios::binary) << bytes;
-  return name;
+  return std::ofstream(Native(name), std::ios::binary) << bytes, name;
 }
 
 // A file of that size that reads as zeros, without taking the disk space.
@@ -194,9 +179,6 @@ struct FakeServer {
   std::uint32_t now = 1000;  // milliseconds
   std::function<std::uint32_t(std::size_t bytes)> writeMs = [](std::size_t) { return 0u; };
   std::function<void()> onStart = [] {};
-  win::Status startStatus = win::kOk;
-  std::uint32_t httpStatus = 200;
-  std::string reply = "<uploadTemplate/>";
 
   std::vector<std::string> headers, writes;
   bool started = false, ended = false;
@@ -220,30 +202,21 @@ struct FakeServer {
   class Connection : public UploadConnection {
    public:
     explicit Connection(FakeServer& server) : s_(server) {}
-    win::Status AddHeader(const std::string& line) override {
-      s_.headers.push_back(line);
-      return win::kOk;
-    }
+    win::Status AddHeader(const std::string& line) override { return s_.headers.push_back(line), win::kOk; }
     win::Status Start(std::uint32_t contentLength) override {
       s_.started = true;
       s_.announced = contentLength;
       s_.onStart();
-      return s_.startStatus;
+      return win::kOk;
     }
     win::Status Write(std::string_view piece) override {
       s_.writes.emplace_back(piece);
       s_.now += s_.writeMs(piece.size());
       return win::kOk;
     }
-    win::Status End() override {
-      s_.ended = true;
-      return win::kOk;
-    }
-    bool QueryStatusCode(std::uint32_t* code) override {
-      *code = s_.httpStatus;
-      return true;
-    }
-    std::string ReadReply() override { return s_.reply; }
+    win::Status End() override { return s_.ended = true, win::kOk; }
+    bool QueryStatusCode(std::uint32_t* code) override { return *code = 200, true; }
+    std::string ReadReply() override { return "<uploadTemplate/>"; }
 
    private:
     FakeServer& s_;
