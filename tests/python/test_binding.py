@@ -6,7 +6,6 @@ one exported symbol."""
 import os
 import subprocess
 import sys
-import tempfile
 import unittest
 import weakref
 
@@ -245,10 +244,6 @@ class PointerObjects(Objects):
                 '_3412000000000000_p_infoEffectURL', "<Swig Object of type 'infoEffectURL *' at 0x1234>"))
             self.assertEqual((hex(self.record), oct(self.record), long(self.record), int(self.record)),
                              ('1234', '11064', 4660L, 4660))
-            with tempfile.TemporaryFile() as out:
-                print >> out, self.record,
-                out.seek(0)
-                self.assertEqual(out.read(), repr(self.record))
         same = peer.new_CString(u'other')  # of the same module: one type compares
         with Relocated(self.text, 0x1000), Relocated(same, 0x2000):
             self.assertEqual((self.text < same, cmp(same, self.text)), (True, 1))
@@ -261,24 +256,6 @@ class PointerObjects(Objects):
         self.assertEqual((self.record.own(True), self.record.own(0), self.record.own()), (False, True, False))
         self.assertEqual((self.record.acquire(), self.record.own()), (None, True))
         self.assertRaises(TypeError, self.record.own, 1, 2)
-
-    def test_chains_append_refuse_cycles_and_a_link_of_the_right_type_is_found(self):
-        first, second = peer.new_CString(u'1'), peer.new_CString(u'linked')
-        before = sys.getrefcount(first)
-        self.record.append(first)
-        self.assertEqual(repr(self.record), "<Swig Object of type 'infoEffectURL *' at 0x%x>%r"
-                         % (address_of(self.record), first))
-        self.assertEqual(sys.getrefcount(first), before + 1)
-        self.record.append(second)
-        self.assertEqual((sys.getrefcount(first), self.record.next()), (before, second))
-        self.assertRaises(SystemError, self.record.append, 5)
-        self.assertRaises(ValueError, self.record.append, self.record)
-        self.assertRaises(ValueError, second.append, self.record)  # second -> record -> second
-        first.append(self.record)
-        value = native.infoEffectURL_strURL_get(first)
-        self.assertEqual(peer.CString_value(value), u'text')
-        for made in (first, second, value):
-            peer.delete_CString(made)
 
     def test_instances_proxies_and_chains_of_this_are_accepted(self):
         class Holder(object):
@@ -306,10 +283,7 @@ class NewStyle(object):
     __swig_destroy__ = peer.delete_CString
 class Classic:
     __swig_destroy__ = peer.delete_CString
-class Slotted(object):
-    __slots__ = ()
-    __swig_destroy__ = peer.delete_CString
-for cls in (NewStyle, Classic, Slotted):
+for cls in (NewStyle, Classic):
     peer.CString_swigregister(cls)
     value = native.infoEffectURL_strTag_get(record)
     this = getattr(value, 'this', value)
@@ -342,7 +316,7 @@ native.delete_infoEffectURL(record)
 '''
 EXPECTED = ("['type_pointer']\nTrue peer made\n"
             "NewStyle PySwigObject True peer made\ninstance PySwigObject True peer made\n"
-            "PySwigObject PySwigObject True peer made\nPySwigObject\n"
+            "PySwigObject\n"
             "Recorded [False] KeyError\nFailing [False] KeyError\n"
             "swig/python detected a memory leak of type 'infoEffectURL *', no destructor found.\n"
             "NoDestroy [False] KeyError\n")

@@ -108,7 +108,7 @@ class Discovery(SessionTest):
         self.call('SetOBURLAsReg', u'')
         self.assertEqual(self.discover(), unicode(SERVER_HOST))
 
-    def test_a_404_is_reachable_and_a_refusing_host_falls_back_at_once(self):
+    def test_a_404_is_reachable_a_refusing_host_falls_back_at_once_and_a_long_url_is_not_probed(self):
         self.svc.script(DETECTION_HOST, '/', [reply('missing', 404)])
         self.assertEqual(self.discover(), unicode(SERVER_HOST))
         self.assertEqual((self.call('m_bServerReachable_get'), self.call('m_szChkServerUrl_get')),
@@ -119,8 +119,6 @@ class Discovery(SessionTest):
         self.assertEqual(self.discover(), unicode(STAGING_HOST))
         self.assertEqual((self.trace(), self.call('m_bServerReachable_get')), (FALLBACK, 0))
         self.assertEqual(self.svc.requests(), [])
-
-    def test_a_probe_url_too_long_for_its_buffer_is_refused_unprobed(self):
         os.environ['PYUPLOADER_DETECTION_HOST'] = 'd' * 253  # with "http://", 260 bytes
         self.new_session()
         self.assertEqual(self.discover(), unicode(STAGING_HOST))
@@ -156,7 +154,9 @@ class SignIn(SessionTest):
         return self.call('GetLoginTokenID'), self.call('GetUserName')
 
     def test_the_form_goes_over_tls_after_discovery_and_the_default_host_probe(self):
-        self.assertEqual(self.login(ACCOUNT, PASSWORD, xml_reply(SIGNED_IN)), 1)
+        with Ticker() as ticker:
+            self.assertEqual(self.login(ACCOUNT, PASSWORD, xml_reply(SIGNED_IN, delay=1.5)), 1)
+        self.assertGreater(ticker.ticks, 20, 'the interpreter lock was kept while the service answered')
         self.assertEqual([(r.host, r.path) for r in self.svc.requests()], [
             (DETECTION_HOST, '/'), (DETECTION_HOST, OBSERVER), (DEFAULT_HOST, '/'),
             (SERVER_HOST, SIGN_IN)])
@@ -169,17 +169,11 @@ class SignIn(SessionTest):
                          '\r\nContent-Length: %d\r\n\r\n' % (SERVER_HOST, len(body)))
         self.assertEqual(self.state(), (TOKEN, u'Ann'))
         self.assertEqual(self.call('GetPresetDownloadURL'), u'/mine?p=1')  # stored, as it is
-
-    def test_a_host_set_by_the_application_still_probes_the_default_host(self):
-        self.call('SetOBURLAsReg', unicode(STAGING_HOST))
+        self.svc.reset()
+        self.call('SetOBURLAsReg', unicode(STAGING_HOST))  # a host set by the application
         self.assertEqual(self.login(), 1)
         self.assertEqual([(r.host, r.path) for r in self.svc.requests()],
                          [(DEFAULT_HOST, '/'), (STAGING_HOST, SIGN_IN)])
-
-    def test_other_python_threads_run_while_the_service_answers(self):
-        with Ticker() as ticker:
-            self.assertEqual(self.login(ACCOUNT, PASSWORD, xml_reply(SIGNED_IN, delay=1.5)), 1)
-        self.assertGreater(ticker.ticks, 20, 'the interpreter lock was kept')
 
     def test_a_first_login_page_is_opened_and_its_token_not_kept(self):
         first_login = 'https://www.orbishare.com/firstLogin?id=7'

@@ -49,29 +49,6 @@ TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
   EXPECT_TRUE(xml::Document(L"<a><b></a>").Top().Children().empty());
 }
 
-TEST(Xml, TheChildWalkSeesEveryKindOfNodeAndAttributesMatchTheExactName) {
-  const xml::Document document(
-      L"<?xml version=\"1.0\"?><!--c--><pip><!--d--><pipURL n=\"&amp;\u00E4\" N=\"9\">x%2Fy</pipURL>"
-      L"t<![CDATA[u]]></pip>");
-  using T = xml::NodeType;
-  auto walk = [](const xml::Node& node) {
-    std::vector<std::pair<T, std::wstring>> seen;
-    for (const xml::Node& child : node.Children()) seen.emplace_back(child.type(), child.Name());
-    return seen;
-  };
-  EXPECT_EQ(walk(document.Top()), (std::vector<std::pair<T, std::wstring>>{
-                                      {T::kProcessingInstruction, L"xml"}, {T::kComment, L"#comment"},
-                                      {T::kElement, L"pip"}}));
-  const xml::Node pip = document.Top().Children()[2];
-  EXPECT_EQ(walk(pip), (std::vector<std::pair<T, std::wstring>>{{T::kComment, L"#comment"},
-                                                                {T::kElement, L"pipURL"},
-                                                                {T::kText, L"#text"},
-                                                                {T::kCData, L"#cdata-section"}}));
-  const xml::Node url = pip.Children()[1];
-  EXPECT_EQ((std::vector<std::wstring>{url.Text(), url.Attribute("n"), url.Attribute("N"), url.Attribute("NN")}),
-            (std::vector<std::wstring>{L"x%2Fy", L"&\u00E4", L"9", L""}));
-}
-
 const std::string kHeader = "Windows Registry Editor Version 5.00\r\n\r\n";
 const std::string kSection = "[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n";
 constexpr wchar_t kSubkey[] = L"SOFTWARE\\Quillmark\\Lumivanta";

@@ -1,6 +1,6 @@
 // The texts the session sends and receives: the two escapes of values sent to
 // the service, the decodings of replies and links, the token guarded against a
-// racing reader, and the service hosts as settings.
+// racing reader.
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -71,23 +71,6 @@ TEST(SessionToken, AReaderRacingAWriterSeesTheOldOrTheNewTokenNeverAMixture) {
   stop = true;
   for (auto& reader : readers) reader.join();
   EXPECT_EQ(torn, 0);
-}
-
-TEST(ServiceHosts, TheEnvironmentReplacesEachCompiledDefaultUnlessEmpty) {
-  for (const auto& [variable, member] : {std::pair{ServiceHosts::kDefaultHostVariable, &ServiceHosts::defaultHost},
-                                         {ServiceHosts::kStagingHostVariable, &ServiceHosts::stagingHost},
-                                         {ServiceHosts::kDetectionHostVariable, &ServiceHosts::detectionHost}}) {
-    std::wstring compiled;
-    {
-      test_support::ScopedEnv unset(variable, std::nullopt);
-      compiled = ServiceHosts::FromEnvironment().*member;
-    }
-    EXPECT_FALSE(compiled.empty()) << variable;
-    test_support::ScopedEnv empty(variable, std::string());
-    EXPECT_EQ(ServiceHosts::FromEnvironment().*member, compiled) << variable;
-    test_support::ScopedEnv set(variable, std::string("host.test"));
-    EXPECT_EQ(ServiceHosts::FromEnvironment().*member, L"host.test") << variable;
-  }
 }
 
 }  // namespace

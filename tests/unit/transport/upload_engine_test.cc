@@ -5,7 +5,6 @@
 #include <regex>
 
 #include "support/fixtures.h"
-#include "transport/ChunkLog.h"
 #include "transport/UploadRequest.h"
 #include "transport/UploadResult.h"
 #include "transport/UploadStatus.h"
@@ -273,24 +272,6 @@ TEST_F(Upload, FileFaultsEndTheUploadWithTheirStatus) {
     EXPECT_EQ(listener.Only("FileBegin f1").size(), c.status == 0x800703EEu ? 1u : 0u);
     EXPECT_EQ(OpenDescriptors(), descriptors);
   }
-}
-
-// The chunk log, for benchmarks, takes a line per chunk: its bytes and write time.
-TEST_F(Upload, TheChunkLogNamedByTheEnvironmentGetsALinePerChunk) {
-  Run();
-  EXPECT_FALSE(std::filesystem::exists("chunks.log"));
-  ScopedEnv log(ChunkLog::kPathVariable, std::string("chunks.log"));
-  AddSparseFile({32 * KiB, 64 * KiB, 10});
-  Run();
-  std::istringstream lines(ReadFile("chunks.log"));
-  std::vector<std::size_t> bytes;
-  std::size_t count = 0;
-  long long micros = -1;
-  while (lines >> count >> micros) {
-    EXPECT_GE(micros, 0);
-    bytes.push_back(count);
-  }
-  EXPECT_EQ(bytes, (std::vector<std::size_t>{32 * KiB, 64 * KiB, 10}));
 }
 
 }  // namespace
