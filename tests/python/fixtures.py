@@ -1,7 +1,5 @@
-"""Fixtures of the Python suites, which run inside tests/sandbox/run: the
-reference service's control interface, the debug trace, pointer objects seen
-through their fixed layout, and a session or an upload per test.
-
+"""Fixtures of the Python suites, run inside tests/sandbox/run: the reference service's
+control interface, the trace, pointer objects' layout, a session or an upload per test.
 Replies (reply()) may also set: delay (seconds), pieces and pause, chunked,
 no_length, close_after (bytes, then close), hang, read_rate (request bytes per
 second), abort_after (body bytes, then drop) and raw_b64 (instead of a reply).
@@ -60,9 +58,8 @@ def _decode(value):
 
 
 class Recorded(object):
-    """A recorded request (method, target, path, head, headers, body, body_size,
-    complete, host, port, tls, upload) or part of its multipart body (kind, name,
-    filename, content_type, size, sha256, content)."""
+    """A recorded request (method, target, path, head, headers, body, body_size, complete,
+    host, port, tls, upload) or multipart part (kind, name, filename, size, sha256, content)."""
 
     def __init__(self, document):
         for key, value in document.items():
@@ -181,8 +178,7 @@ class Relocated(object):
 
 
 class Test(unittest.TestCase):
-    """A reset service and the debug trace switched on in a hive and an output
-    file of a temporary folder, which the environment names."""
+    """A reset service, and the trace on in a temporary hive and output file."""
     HIVE = ('Windows Registry Editor Version 5.00\r\n\r\n[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\'
             'Lumivanta]\r\n"DumpMsg"=dword:00000001\r\n')
 
@@ -273,8 +269,7 @@ class Reports(object):
 
 
 class UploadTest(Test):
-    """A preset file and twelve images of random bytes, and an uploader with a
-    recording callable."""
+    """A preset file, twelve images of random bytes, and an uploader with a recording callable."""
 
     def setUp(self):
         Test.setUp(self)
@@ -285,7 +280,7 @@ class UploadTest(Test):
 
     def replace_files(self, preset_size=3000, image_sizes=None, prefix=u'preset-\xe9-'):
         folder = tempfile.mkdtemp(prefix=prefix, dir=self.folder)
-        self.preset, self.images = None, []
+        self.images = []
         for i, size in enumerate([preset_size] + (image_sizes or [1000 + 77 * i for i in range(12)])):
             path = os.path.join(folder, u'Golden hour.preset' if i == 0 else u'preview_%02d.png' % i)
             with open(path, 'wb') as out:
@@ -296,8 +291,8 @@ class UploadTest(Test):
 
     def parts(self):
         """(field name, path) of the fourteen file parts, in wire order."""
-        names = ['PIPfile', 'PIPimg'] + ['PIPimg_%d' % (i + 1) for i in range(12)]
-        return zip(names, [self.preset, self.images[0]] + self.images)
+        return zip(['PIPfile', 'PIPimg'] + ['PIPimg_%d' % (i + 1) for i in range(12)],
+                   [self.preset, self.images[0]] + self.images)
 
     def new_uploader(self, *session):
         uploader = PyPresetUploader(*(session or SESSION))
@@ -313,8 +308,7 @@ class UploadTest(Test):
         return wait_until((reports or self.reports).completions, timeout, 'completion report')[0]
 
     def wait_for_progress(self, reports=None):
-        reports = reports or self.reports
-        wait_until(lambda: [r for r in reports.progress() if r[2] > 0], 30.0, 'progress')
+        wait_until(lambda: [r for r in (reports or self.reports).progress() if r[2] > 0], 30.0, 'progress')
 
     def slow_reader(self, bytes_per_second):
         self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=bytes_per_second)])

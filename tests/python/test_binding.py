@@ -11,7 +11,7 @@ import weakref
 
 import _PyUploaderTestPeer as peer
 import _PyUploader as native
-from fixtures import Relocated, address_of, cell, run_python
+from fixtures import Relocated, run_python
 
 SKIP, REFUSE = 'skip', 'refuse'  # what a None object does: nothing, or ValueError
 MAX_PATH = 260
@@ -225,17 +225,6 @@ class SessionMembers(Objects):
             self.assertRefused(TypeError, "in method 'OBLoginData_m_bServerReachable_set', argument 2 "
                                "of type 'BOOL'", self.member, 'm_bServerReachable', value)
 
-    def test_handles_are_copied_in_and_out_through_heap_cells(self):
-        members = ('m_hInternet', 'm_hConnect', 'm_hRequest')
-        for number, name in enumerate(members, 1):
-            handle = self.member(name)
-            self.assertEqual((repr(handle)[:34], cell(handle).value), ("<Swig Object of type 'HINTERNET *'", None))
-            cell(handle).value = 0x1000 * number
-            self.member(name, handle)
-            cell(handle).value = 0  # the member holds a copy
-        self.assertEqual([(cell(self.member(name)).value or 0) for name in members], [0x1000, 0x2000, 0x3000])
-
-
 class PointerObjects(Objects):
 
     def test_text_forms_numbers_and_order_by_address(self):
@@ -256,16 +245,6 @@ class PointerObjects(Objects):
         self.assertEqual((self.record.own(True), self.record.own(0), self.record.own()), (False, True, False))
         self.assertEqual((self.record.acquire(), self.record.own()), (None, True))
         self.assertRaises(TypeError, self.record.own, 1, 2)
-
-    def test_instances_proxies_and_chains_of_this_are_accepted(self):
-        class Holder(object):
-            def __init__(self, this):
-                self.this = this
-        record = Holder(self.record)
-        for obj in (record, weakref.proxy(record), Holder(Holder(self.record))):
-            value = native.infoEffectURL_strTag_get(obj)
-            self.assertEqual(peer.CString_value(value), u'text')
-            peer.delete_CString(value)
 
 
 # Run in a fresh interpreter per import order: registered classes and the ring

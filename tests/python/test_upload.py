@@ -34,8 +34,7 @@ def upload_template(url=u'', error=u''):
 
 
 def digest(path):
-    with open(path, 'rb') as f:
-        data = f.read()
+    data = open(path, 'rb').read()
     return len(data), hashlib.sha256(data).hexdigest()
 
 
@@ -90,17 +89,6 @@ class Publishing(UploadTest):
         self.assertEqual(self.completion(second)[3:5], (1, SECOND_URL))
         self.assertNotEqual(second.progress()[0][3], progress[0][3])
         self.assertEqual(dict(self.uploads()[1].upload.fields)['title'], 'Second')
-
-    def test_str_texts_and_absent_texts(self):
-        self.replace_files(prefix='preset-')
-        paths = [str(p.encode('utf-8')) for p in [self.preset] + self.images]
-        uploader = self.new_uploader('api.orbishare.com', 'tok', '5.0', None, None)
-        self.assertEqual(self.start(uploader, paths, ('k', 'T\\xe9', None, None, '')), 1)
-        self.assertEqual(self.completion()[3], 1)
-        fields = dict(self.uploads()[0].upload.fields)
-        self.assertEqual([fields[n] for n in ('title', 'token', 'category', 'versionType')],
-                         ['T\\xe9', 'tok', '', ''])
-
 
 class ServerAnswers(UploadTest):
 

@@ -26,7 +26,7 @@ TypeInfo* Type(const char* mangled) {
     InitializeTypeTable(made->table());
     return made;
   }();
-  return TypeQuery(mangled);
+  return types ? TypeQuery(mangled) : nullptr;
 }
 
 // Another module's static type of that name, size and flags stands behind the object.

@@ -138,20 +138,6 @@ TEST(DebugOutput, LinesStayWholeFromManyThreads) {
   EXPECT_EQ(seen.size(), 800u);
 }
 
-// The switch and the prefix belong to the process: a fresh one starts as at load.
-TEST(Trace, IsOffUntilAComponentReadsTheSwitch) {
-  GTEST_FLAG_SET(death_test_style, "threadsafe");
-  EXPECT_EXIT(
-      {
-        TraceCapture capture;
-        TraceMessage(L"early");
-        TraceSetPrefix("Unit");
-        TraceMessage(L"late");
-        std::exit(capture.Bytes() == "[Unit]late\n" ? 0 : 1);
-      },
-      ::testing::ExitedWithCode(0), "");
-}
-
 TEST(Trace, AnUnopenableKeyKeepsTheStateAndLongNamesKeepThePrefix) {
   TraceCapture capture;
   TraceSetPrefix("First");

@@ -1,6 +1,7 @@
 // The texts the session sends and receives: the two escapes of values sent to
 // the service, the decodings of replies and links, the token guarded against a
 // racing reader.
+// ctest timeout: 60
 #include <gtest/gtest.h>
 
 #include <atomic>

@@ -66,8 +66,7 @@ inline std::wstring MakeFile(const std::wstring& name, const std::string& bytes)
 
 // A file of that size that reads as zeros, without taking the disk space.
 inline std::wstring MakeSparseFile(const std::wstring& name, std::uintmax_t size) {
-  std::ofstream(Native(name), std::ios::binary).close();
-  std::filesystem::resize_file(Native(name), size);
+  std::filesystem::resize_file(Native(MakeFile(name, "")), size);
   return name;
 }
 
@@ -92,33 +91,26 @@ class TempFolderTest : public ::testing::Test {
   std::filesystem::path folder_;
 };
 
-// A hive file whose trace switch holds `dumpMsg` (none: the value is missing),
-// and the trace lines captured in a file; make it before the object under test.
+// A hive file holding the trace switch, and the trace lines captured in a
+// file; make it before the object under test, which reads the switch.
 class TraceCapture {
  public:
-  explicit TraceCapture(std::optional<std::uint32_t> dumpMsg = 1)
+  TraceCapture()
       : folder_(std::filesystem::temp_directory_path() / ("trace_" + std::to_string(::getpid()))),
         hiveEnv_(registry::kHivePathVariable, (folder_ / "hive.reg").string()),
         outputEnv_(debug_output::kOutputPathVariable, (folder_ / "out.log").string()) {
     std::filesystem::create_directories(folder_);
-    SetSwitch(dumpMsg);
+    SetSwitch(1);
   }
   ~TraceCapture() { std::filesystem::remove_all(folder_); }
-
-  void SetSwitch(std::optional<std::uint32_t> dumpMsg) const {
-    char value[40] = "";
-    if (dumpMsg) std::snprintf(value, sizeof value, "\"DumpMsg\"=dword:%08x\r\n", *dumpMsg);
-    std::ofstream(folder_ / "hive.reg") << "Windows Registry Editor Version 5.00\r\n\r\n"
-                                        << "[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n"
-                                        << value;
-  }
-  void RemoveKey() const { std::ofstream(folder_ / "hive.reg") << "REGEDIT4\r\n"; }
+  void SetSwitch(int dumpMsg) const { Hive("[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n\"DumpMsg\"=dword:" + std::to_string(dumpMsg)); }
+  void RemoveKey() const { Hive(""); }  // the key cannot be opened
   std::string Bytes() const { return ReadFile(folder_ / "out.log"); }
 
  private:
+  void Hive(const std::string& key) const { std::ofstream(folder_ / "hive.reg") << "REGEDIT4\r\n\r\n" << key << "\r\n"; }
   std::filesystem::path folder_;
-  ScopedEnv hiveEnv_;
-  ScopedEnv outputEnv_;
+  ScopedEnv hiveEnv_, outputEnv_;
 };
 
 // Writes each event down as a line, with the thread it came on; the cancel poll
