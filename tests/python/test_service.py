@@ -8,7 +8,6 @@ import sys
 import time
 import unittest
 
-import _PyUploader as native
 import _PyUploaderTestPeer as peer
 from fixtures import (DEFAULT_HOST, DETECTION_HOST, SERVER_HOST, STAGING_HOST, UUID, SessionTest,
                       Ticker, cell, reply, xml_reply)
