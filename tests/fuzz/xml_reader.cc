@@ -45,7 +45,7 @@ extern "C" int LLVMFuzzerInitialize(int*, char***) {
 }
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
-  const xml::Document document(service::DecodeUtf8Reply(std::string_view(reinterpret_cast<const char*>(data), size)));
+  const xml::Document document(service::DecodeUtf8Reply(std::string(reinterpret_cast<const char*>(data), size)));
   for (const char* path : kPaths) document.NodeText(path);
   Walk(document, document.Top(), "", 0);
   return 0;

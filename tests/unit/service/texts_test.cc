@@ -32,9 +32,9 @@ TEST(Escapes, QueryValuesKeepTheirSeparatorsAndFormValuesKeepTheSixFields) {
 }
 
 TEST(Decoding, RepliesEndAtTheirFirstZeroAndLinksDecodeEachEscapeIntoOneCharacter) {
-  EXPECT_EQ(service::DecodeUtf8Reply("<a>\xC3\xA4</a>\0<b/>"s), L"<a>\u00E4</a>");
-  EXPECT_EQ(service::DecodeAnsiReply("x\0y"s), L"x");
-  EXPECT_EQ(service::DecodeUtf8Reply("bad \xFF"), L"bad \uFFFD");
+  EXPECT_EQ(service::DecodeUtf8Reply("<a>\xC3\xA4</a>\0<b/>"s), "<a>\xC3\xA4</a>");
+  EXPECT_EQ(service::DecodeAnsiReply("x\0y"s), "x");
+  EXPECT_EQ(service::DecodeUtf8Reply("bad \xFF \xEF\xBF\xBD \xE4<"), "bad \xEF\xBF\xBD \xEF\xBF\xBD \xEF\xBF\xBD<");
   const std::pair<std::wstring, std::wstring> links[] = {
       {L"a%20b%41%42", L"a bAB"}, {L"x%2fy%2Fz", L"x/y/z"}, {L"a%00b", L"a"}, {L"%4Gz", L"\u0004z"},
       {L"a%GGb", L"a"}, {L"%C3%A9", L"\u00C3\u00A9"}, {L"h/p?a=1&b=\u00E4", L"h/p?a=1&b=\u00E4"},
