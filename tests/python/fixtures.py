@@ -30,6 +30,7 @@ DETECTION_HOST, SERVER_HOST = _HOSTS.DETECTION_HOST, _HOSTS.SERVER_HOST
 MAIN_THREAD = thread.get_ident()
 UUID = u'machine-1'
 UPLOAD_PATH = '/servlet/uploadTemplate'
+HTTP_PORT, TLS_PORT = _HOSTS.HTTP_PORT, _HOSTS.TLS_PORT
 
 
 def reply(body=None, status=None, headers=None, **options):
@@ -120,11 +121,15 @@ def pump(seconds):
         time.sleep(0.02)
 
 
-def run_python(code):
-    """Runs code in a fresh interpreter; returns (exit code, stdout, stderr)."""
-    proc = subprocess.Popen([sys.executable, '-c', textwrap.dedent(code)], stdout=subprocess.PIPE,
-                            stderr=subprocess.PIPE)
+def run_python(code, *args, **timeout):
+    """Runs code in a fresh interpreter; returns (exit code, stdout, stderr). One still
+    running after timeout seconds (60) is killed."""
+    proc = subprocess.Popen([sys.executable, '-c', textwrap.dedent(code)] + list(args),
+                            stdout=subprocess.PIPE, stderr=subprocess.PIPE)
+    killer = threading.Timer(timeout.get('timeout', 60), proc.kill)
+    killer.start()
     out, err = proc.communicate()
+    killer.cancel()
     return proc.returncode, out, err
 
 

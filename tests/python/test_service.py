@@ -5,6 +5,7 @@ the interpreter lock, and the references of what the module builds."""
 # ctest timeout: 45
 import os
 import sys
+import threading
 import time
 import unittest
 
@@ -82,6 +83,38 @@ class Discovery(SessionTest):
             self.assertEqual(self.discover(answer), unicode(STAGING_HOST))
             self.assertEqual(self.trace(), lines)
             self.assertEqual(self.call('GetSignUpURL'), u'http://%s%s&uuid=%s' % (STAGING_HOST, link, UUID))
+
+    def test_a_server_host_that_is_not_a_bare_host_name_is_refused(self):
+        for value in [u'api.orbishare.com:8080/evil?x=', u'user@api.orbishare.com', u'api.orbishare.com/path',
+                      u'api orbishare', u'api.orbishare.com?q', u'', u'\xe4pi.test']:
+            self.new_session()
+            self.assertEqual(self.discover(xml_reply(info_xml(APIUrl=value.encode('utf-8')))), unicode(STAGING_HOST))
+            self.assertEqual(self.trace(), [u'Update OBInfo fail: APIUrl is not a host name: ' + value] + FALLBACK)
+
+    def test_values_written_from_python_into_the_handles_are_never_closed(self):
+        # Answered while it waits, the probe closes its handles itself; silent, the
+        # waiting thread closes them: neither may close a foreign value.
+        cells = [self.call(m + '_get') for m in ('m_hInternet', 'm_hConnect')]
+        for handle in cells:
+            cell(handle).value = 0x1000
+        stop = threading.Event()
+
+        def overwrite():
+            while not stop.is_set():
+                self.call('m_hInternet_set', cells[0])
+                self.call('m_hConnect_set', cells[1])
+                time.sleep(0.001)
+        for delay, host in ((1, SERVER_HOST), (PROBE_LIMIT + 0.5, STAGING_HOST)):
+            self.call('LogoutOrbishare')
+            self.svc.script(DETECTION_HOST, '/', [reply(delay=delay)])
+            writer = threading.Thread(target=overwrite)
+            writer.start()
+            try:
+                self.assertEqual(self.discover(), unicode(host))
+            finally:
+                stop.set()
+                writer.join()
+                stop.clear()
 
     def test_an_empty_field_empties_its_link_and_an_absent_one_keeps_the_default(self):
         self.discover(xml_reply(info_xml(APIUrl=SERVER_HOST, SignUp=''), status=500))
@@ -283,6 +316,12 @@ class Categories(SessionTest):
         self.assertEqual(self.name_of(-2), (1, u'Negative'))
         self.svc.host_state(SERVER_HOST, 'down')
         self.assertEqual(self.categories(None), expected)
+        self.svc.host_state(SERVER_HOST, 'up')
+        self.clear_trace()
+        many = self.categories(u'<categories>%s</categories>' % u''.join(  # one reply adds at most 10000
+            u'<category categoryid="%d">C%d</category>' % (i, i) for i in range(100000, 110005)))
+        self.assertEqual((len(many) - len(expected), many[u'100000'], many[u'109999']), (10000, u'C100000', u'C109999'))
+        self.assertEqual(self.trace(), [u'GetPresetCategory: only the first 10000 categories of the reply are kept.'])
 
 class RelatedVideo(SessionTest):
     QUERY = '&AP=KRV&Version=5.0&versionType=Retail&uuid=machine-1'

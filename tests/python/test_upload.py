@@ -4,6 +4,7 @@ and an uploader destroyed while its worker runs."""
 # ctest timeout: 120
 import gc
 import hashlib
+import os
 import sys
 import threading
 import time
@@ -12,7 +13,7 @@ import urllib
 from StringIO import StringIO
 
 from fixtures import (MAIN_THREAD, SERVER_HOST, SESSION, UPLOAD_PATH, Reports, UploadTest, pump,
-                      reply, threads_and_descriptors, wait_until, xml_reply)
+                      reply, run_python, threads_and_descriptors, wait_until, xml_reply)
 
 FIRST_URL = u'http://api.orbishare.com/template/view.jsp?id=5001'
 SECOND_URL = u'http://api.orbishare.com/template/view.jsp?id=5002'
@@ -57,6 +58,23 @@ class Publishing(UploadTest):
                           for name, path in self.parts()])
         self.assertEqual(self.trace(u'[PyPresetUploader]'),
                          [u'PyPresetUploader::OnBackgroundUploadComplete'])
+
+    def test_the_pause_setting_is_read_when_the_uploader_is_made_and_a_refused_one_traced(self):
+        # Fourteen files of one chunk each: fourteen pauses of at least 0.2 s,
+        # though the setting says 0 by the time the upload starts.
+        os.environ['PYUPLOADER_CHUNK_PAUSE_MS'] = 'fast'
+        self.clear_trace()
+        self.new_uploader()
+        os.environ['PYUPLOADER_CHUNK_PAUSE_MS'] = '200'
+        self.uploader = self.new_uploader()
+        os.environ['PYUPLOADER_CHUNK_PAUSE_MS'] = '0'
+        started = time.time()
+        self.start()
+        self.assertEqual(self.completion()[3], 1)
+        self.assertGreaterEqual(time.time() - started, 14 * 0.2)
+        self.assertEqual(self.trace(u'[PyPresetUploader]'), [
+            u'PYUPLOADER_CHUNK_PAUSE_MS refused: "fast" is not a whole number of milliseconds from 0 to 1000;'
+            u' the pause stays 50 ms', u'PyPresetUploader::OnBackgroundUploadComplete'])
 
     def test_progress_rises_on_the_main_thread_and_a_second_upload_starts_from_the_speed(self):
         # Read slowly, the files span half-seconds: a speed is measured and kept.
@@ -235,6 +253,31 @@ class Stopping(UploadTest):
         gc.collect()
         self.assertEqual(sys.getrefcount(self.reports), references_before - 1)
         self.assertFalse(self.uploads(bodies=False)[0].complete)
+
+    def test_an_interpreter_exiting_mid_upload_ends_at_once_and_cuts_the_upload_off(self):
+        # The uploader in a global (destroyed as the globals are cleared) or in a
+        # reference cycle (never collected: its worker still runs when the process ends).
+        for in_cycle in (False, True):
+            self.svc.reset()
+            self.slow_reader(1024 * 1024)
+            started = time.time()
+            code, out, err = run_python('''
+                from fixtures import Reports, SESSION, TEXTS, wait_until
+                from PyUploader import PyPresetUploader
+                reports = Reports()
+                uploader = PyPresetUploader(*SESSION)
+                uploader.SetCallback(reports)
+                uploader.StartUpload(%r, %r, *TEXTS)
+                wait_until(lambda: [r for r in reports.progress() if r[2] > 0], 30.0)
+                if %r:
+                    cycle = [uploader, None]
+                    cycle[1] = cycle
+                    del uploader
+                ''' % (self.preset, self.images, in_cycle), timeout=10)
+            self.assertEqual(code, 0, (in_cycle, err))
+            self.assertLess(time.time() - started, 5.0, in_cycle)
+            [upload] = wait_until(lambda: [u for u in self.uploads(False) if u.error or u.complete], 10.0)
+            self.assertFalse(upload.complete, in_cycle)
 
     def test_the_callable_may_delete_the_uploader_it_is_called_by(self):
         threads_before = threads_and_descriptors()[0]

@@ -12,8 +12,7 @@ import termios
 import time
 import unittest
 
-from refservice import RefService, SERVER_HOST, reply
-from upload_support import UPLOAD_PATH
+from fixtures import SERVER_HOST, UPLOAD_PATH, RefService, reply
 
 DEMO = os.path.join(os.path.dirname(os.path.abspath(__file__)), '..', '..', 'examples',
                     'publish_preset.py')
