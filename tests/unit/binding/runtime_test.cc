@@ -11,6 +11,7 @@
 #include "module/runtime/TypeTable.h"
 #include "module/runtime/call.h"
 #include "module/runtime/pointers.h"
+#include <stdexcept>
 #include "support/fixtures.h"
 
 namespace {
@@ -75,7 +76,26 @@ PyObject* Kinds(PyObject*, PyObject* args) {
               Integer("int"));
 }
 
-TEST(CallSequence, CopiesMadeBeforeARefusalAreFreed) {
+// The operation throws after a copy was made: the exception becomes a Python error.
+PyObject* Throws(PyObject*, PyObject* args) {
+  return Call(args, "throws", ReturnsNone{}, [](int which, const wchar_t*) {
+    if (which == 0) throw std::bad_alloc();
+    if (which == 1) throw std::length_error("text too long");
+    throw which;
+  }, Integer("int"), WideString());
+}
+
+TEST(CallSequence, CopiesMadeBeforeARefusalOrAnExceptionAreFreed) {
+  for (const auto& [which, text] : std::vector<std::pair<int, std::string>>{
+           {0, ""}, {1, "text too long"}, {2, "unknown C++ exception"}}) {
+    PyRef args(Py_BuildValue("(iu)", which, L"copied copied copied copied"));
+    EXPECT_EQ(Throws(nullptr, args.get()), nullptr);
+    PyObject *type, *value, *traceback;
+    PyErr_Fetch(&type, &value, &traceback);
+    PyRef held(type), message(value ? PyObject_Str(value) : nullptr), rest(value), trace(traceback);
+    EXPECT_EQ(type, which == 0 ? PyExc_MemoryError : PyExc_RuntimeError);
+    EXPECT_EQ(message ? PyString_AsString(message.get()) : "", text);
+  }
   Type("_p_Thing");
   PyRef args(Py_BuildValue("(us)", L"copied copied copied copied copied", "not an int"));
   for (int i = 0; i < 100; ++i) {

@@ -41,6 +41,17 @@ TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
     EXPECT_EQ((std::pair{lookup.outcome, lookup.text}), (std::pair{c.outcome, c.found})) << c.path;
   }
   EXPECT_TRUE(xml::Document().empty());
+  xml::Document first(std::string("<a>x</a>"));  // short enough to live inside a string object
+  const xml::Document moved(std::move(first));
+  first = xml::Document(std::string("<b>y</b>"));  // takes the first one's place
+  EXPECT_EQ(moved.NodeText("a").text, L"x") << "a moved document reads its own text";
+  // A node record takes 64 bytes: a quarter of the bound's count is read, the whole count is not.
+  auto elements = [](std::size_t count) {
+    std::string text = "<a>";
+    for (std::size_t i = 0; i < count; ++i) text += "<b/>";
+    return xml::Document(text + "</a>").empty();
+  };
+  EXPECT_EQ((std::pair{elements(xml::kMaxTreeBytes / 256), elements(xml::kMaxTreeBytes / 64)}), (std::pair{false, true}));
   EXPECT_TRUE(xml::Document(L"<a><b></a>").Top().Children().empty());
 }
 

@@ -173,6 +173,7 @@ struct FakeServer {
   std::function<void()> onStart = [] {};
 
   std::vector<std::string> headers, writes;
+  std::vector<std::uint32_t> sleeps;  // milliseconds of each
   bool started = false, ended = false;
   std::uint32_t announced = 0;
 
@@ -184,7 +185,7 @@ struct FakeServer {
   std::string Boundary() const { return headers.at(0).substr(headers.at(0).find("boundary=") + 9); }
 
   UploadEnvironment Environment() {
-    return UploadEnvironment{[this] { return now; }, [this](std::uint32_t ms) { now += ms; },
+    return UploadEnvironment{[this] { return now; }, [this](std::uint32_t ms) { sleeps.push_back(ms), now += ms; },
                              [this](const UploadRequest&, UploadProgress*, std::unique_ptr<UploadConnection>* out) {
                                *out = std::make_unique<Connection>(*this);
                                return win::kOk;

@@ -5,6 +5,7 @@
 #include <regex>
 
 #include "support/fixtures.h"
+#include "transport/ChunkPause.h"
 #include "transport/UploadRequest.h"
 #include "transport/UploadResult.h"
 #include "transport/UploadStatus.h"
@@ -34,7 +35,11 @@ std::string FilePart(const std::string& name, const std::string& file, const std
 
 class Upload : public TempFolderTest {
  protected:
-  win::Status Run() { return Uploader(&listener, &request, &result, server.Environment()).Upload(); }
+  win::Status Run() {
+    UploadEnvironment environment = server.Environment();
+    environment.pauseAfterChunkMs = pauseMs;
+    return Uploader(&listener, &request, &result, std::move(environment)).Upload();
+  }
 
   std::vector<std::size_t> ChunkSizes() const {
     std::vector<std::size_t> sizes;
@@ -59,6 +64,7 @@ class Upload : public TempFolderTest {
   UploadResult result;
   RecordingListener<UploadProgress> listener;
   FakeServer server;
+  std::uint32_t pauseMs = ChunkPause::kDefaultMs;
 };
 
 TEST_F(Upload, TheWorkedExampleIsByteExactAndItsLengthAnnounced) {
@@ -177,6 +183,36 @@ TEST_F(Upload, ProgressComesWhenTheHalfSecondChangesAndItsSpeedIsKept) {
   listener.events.clear();
   ASSERT_EQ(Run(), win::kOk);
   EXPECT_EQ(listener.Only("FileProgress g").at(0), "FileProgress g 0 2 0 0 2 0 114688");
+}
+
+// Only the write times size the chunks; the pause after each moves the
+// half-second reports, and a cancel polled after a chunk stops behind it.
+TEST_F(Upload, ThePauseAfterEachChunkMovesTheReportsButNotTheChunks) {
+  for (const auto& [pause, later] : std::vector<std::pair<std::uint32_t, Lines>>{
+           {0, {"98304 229376 1 98304 229376 1 98304", "229376 229376 1 229376 229376 1 98304"}},
+           {1000, {"32768 229376 12 32768 229376 12 16384", "98304 229376 6 98304 229376 6 19660",
+                   "229376 229376 0 229376 229376 0 32768", "229376 229376 0 229376 229376 0 32768"}}}) {
+    for (const int cancelledPoll : {0, 3}) {
+      server = FakeServer();
+      listener = RecordingListener<UploadProgress>();
+      listener.cancelAt = [=](int poll) { return poll == cancelledPoll; };
+      pauseMs = pause;
+      ScriptWriteTimes({300, 300, 300});
+      request = UploadRequest();  // the initial speed estimate again
+      request.AddFile(L"f", MakeSparseFile(L"f", 224 * KiB).c_str());
+      Run();
+      const std::size_t chunks = cancelledPoll ? 2 : 3;
+      std::vector<std::size_t> sizes = {32 * KiB, 64 * KiB, 128 * KiB};
+      sizes.resize(chunks);
+      EXPECT_EQ(ChunkSizes(), sizes);
+      EXPECT_EQ(server.sleeps, std::vector<std::uint32_t>(chunks, pause));
+      if (cancelledPoll) continue;
+      Lines progress;
+      for (const std::string& values : later) progress.push_back("FileProgress f " + values);
+      EXPECT_EQ(listener.Only("FileProgress f 0 "), Lines{"FileProgress f 0 229376 40 0 229376 40 5600"});
+      EXPECT_EQ(Lines(listener.events.begin() + 2, listener.events.end() - 1), progress) << pause;
+    }
+  }
 }
 
 TEST_F(Upload, AZeroSpeedGivesNoTimeLeftInsteadOfTrapping) {

@@ -7,6 +7,8 @@
 
 #include <atomic>
 #include <chrono>
+#include <functional>
+#include <future>
 #include <numeric>
 
 #include "platform/message_queue.h"
@@ -52,6 +54,11 @@ TEST(WorkerThread, RunBeginsOnlyAfterHandleAndIdAreStoredAndJoinGivesItsResultOn
   busy = false;
   for (std::thread& spinner : spinners) spinner.join();
   EXPECT_EQ(ProbeThread().Join(), 0u) << "a thread never started joins at once";
+  struct Throwing : Thread {
+    std::uint32_t Run() override { throw std::bad_alloc(); }  // would end the process
+  } throwing;
+  ASSERT_TRUE(throwing.Start());
+  EXPECT_EQ(throwing.Join(), Thread::kRunFailed);
 }
 
 // What a test window saw, reached through its user data.
@@ -60,6 +67,7 @@ struct Journal {
   bool onOwner = true;
   std::thread::id owner = std::this_thread::get_id();
   std::unique_ptr<ui::Window>* destroyOnFirst = nullptr;  // by its own handler
+  std::function<void()> duringDispatch = [] {};            // run inside each handler
 };
 
 std::atomic<int> g_dropped{0};
@@ -70,6 +78,7 @@ std::intptr_t Record(ui::Window& window, std::uint32_t, std::uintptr_t, std::int
   journal->payloads.push_back(*reinterpret_cast<int*>(lparam));
   delete reinterpret_cast<int*>(lparam);  // the handler owns what it is given
   if (journal->destroyOnFirst) std::exchange(journal->destroyOnFirst, nullptr)->reset();
+  journal->duringDispatch();
   return 0;
 }
 
@@ -115,6 +124,36 @@ TEST_F(Windows, DestroyingAWindowDropsItsMessagesAndAHandlerMayDestroyItsOwn) {
     for (int i = 0; i < 4; ++i) PostNumber(*window, i);
   }).join();
   EXPECT_EQ(g_dropped, 9) << "a thread that never dispatches frees its messages with its windows";
+}
+
+// A throw out of a handler would end the process inside the interpreter's
+// pending call: it costs only its own message. A window destroyed on another
+// thread waits for the dispatch under way and drops the rest.
+TEST_F(Windows, AThrowingHandlerLosesOnlyItsMessageAndADestroyWaitsForTheDispatchUnderWay) {
+  Journal journal;
+  auto window = MakeWindow(journal);
+  journal.duringDispatch = [&] { if (journal.payloads.size() == 1) throw std::bad_alloc(); };
+  for (int i = 0; i < 3; ++i) PostNumber(*window, i);
+  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 3u);
+  EXPECT_EQ(journal.payloads, (std::vector<std::intptr_t>{0, 1, 2}));
+  std::promise<void> entered;
+  std::atomic<bool> returned{false};
+  journal.duringDispatch = [&] {
+    entered.set_value();
+    std::this_thread::sleep_for(std::chrono::milliseconds(50));  // the other thread reaches the destruction
+    returned = true;
+    journal.duringDispatch = [] {};
+  };
+  PostNumber(*window, 3);
+  PostNumber(*window, 4);
+  std::thread destroyer([&] {
+    ASSERT_EQ(entered.get_future().wait_for(std::chrono::seconds(10)), std::future_status::ready);
+    window.reset();
+    EXPECT_TRUE(returned);
+  });
+  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 1u);
+  destroyer.join();
+  EXPECT_EQ(g_dropped, 1);
 }
 
 // Posted from a worker, thousands arrive in order while the main thread only
