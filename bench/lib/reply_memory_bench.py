@@ -5,7 +5,7 @@ import subprocess
 import sys
 
 from bench_support import MiB
-from refservice import RefService, SERVER_HOST, xml_reply
+from fixtures import RefService, SERVER_HOST, xml_reply
 
 REPLY_BOUND = 16 * MiB
 PATH = '/servlet/getPresetCategory'

@@ -15,7 +15,7 @@ import time
 import _PyUploader as native
 import bench_support as bs
 from PyUploader import PyPresetUploader
-from refservice import RefService, SERVER_HOST
+from fixtures import RefService, SERVER_HOST
 
 WARM_UP_ROUNDS = 20
 RSS_MARGIN_KIB = 4 * 1024
