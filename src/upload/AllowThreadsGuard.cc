@@ -4,9 +4,10 @@
 
 #include "upload/InterpreterLockHeld.h"
 
-AllowThreadsGuard::AllowThreadsGuard()
-    : savedThreadState_(InterpreterLockHeld() ? PyEval_SaveThread() : nullptr) {}
+void* AllowThreadsGuard::ReleaseInterpreterLock() {
+  return InterpreterLockHeld() ? PyEval_SaveThread() : nullptr;
+}
 
-AllowThreadsGuard::~AllowThreadsGuard() {
-  if (savedThreadState_ != nullptr) PyEval_RestoreThread(savedThreadState_);
+void AllowThreadsGuard::RetakeInterpreterLock(void* released) {
+  if (released != nullptr) PyEval_RestoreThread(static_cast<PyThreadState*>(released));
 }

@@ -8,6 +8,7 @@
 
 #include "module/runtime/PyRef.h"
 #include "module/runtime/conversions.h"
+#include "module/runtime/result_kinds.h"
 #include "module/runtime/status.h"
 #include "test_module.h"
 
@@ -113,6 +114,24 @@ TEST(ResultConversions, NarrowArrayKeepsInnerZerosAndDropsTrailingOnes) {
   EXPECT_EQ(std::string(PyString_AS_STRING(result.get()), PyString_GET_SIZE(result.get())),
             std::string("a\0b", 3));
   EXPECT_EQ(binding::TrimTrailingZeros(bytes + 3, 5), 0u);
+}
+
+// Wide texts reach Python whole: inner zeros and characters beyond the BMP included.
+TEST(ResultConversions, WideTextsBecomeUnicodeWithEveryCharacter) {
+  const std::wstring text(L"m\u00E4\0t\U0001F600", 5);
+  const auto same = [&](PyObject* object) {
+    return object && PyUnicode_CheckExact(object) &&
+           std::wstring(reinterpret_cast<const wchar_t*>(PyUnicode_AS_UNICODE(object)),
+                        PyUnicode_GET_SIZE(object)) == text;
+  };
+  EXPECT_TRUE(same(PyRef(binding::ReturnsUnicode{}.Make(text)).get()));
+  EXPECT_TRUE(same(PyRef(binding::ReturnsUnicodeOrNone{}.Make(text)).get()));
+  EXPECT_EQ(PyRef(binding::ReturnsUnicodeOrNone{}.Make(std::nullopt)).get(), Py_None);
+  PyRef dictionary(binding::ReturnsUnicodeDict{}.Make({{L"7", text}, {text, L""}}));
+  ASSERT_TRUE(dictionary && PyDict_CheckExact(dictionary.get()));
+  EXPECT_EQ(PyDict_Size(dictionary.get()), 2);
+  PyRef key(binding::FromWide(L"7"));
+  EXPECT_TRUE(same(PyDict_GetItem(dictionary.get(), key.get())));
 }
 
 }  // namespace
