@@ -1,13 +1,13 @@
 // The module's entry point, the only symbol the library exports.
 #include <Python.h>
 
+#include "interpreter/AllowThreadsGuard.h"
 #include "module/function_table.h"
 #include "module/runtime/TypeTable.h"
 #include "module/runtime/exception_barrier.h"
 #include "module/types.h"
 #include "platform/blocking_scope.h"
 #include "platform/http_global.h"
-#include "upload/AllowThreadsGuard.h"
 
 namespace {
 

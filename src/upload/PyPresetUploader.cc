@@ -6,13 +6,13 @@
 #include <string_view>
 
 #include "diag/trace.h"
+#include "interpreter/AllowThreadsGuard.h"
+#include "interpreter/OnInterpreterMainThread.h"
 #include "platform/file.h"
 #include "platform/text.h"
 #include "platform/xml.h"
 #include "service/unescape_url.h"
 #include "transport/WideToUtf8.h"
-#include "upload/AllowThreadsGuard.h"
-#include "upload/OnInterpreterMainThread.h"
 
 namespace {
 

@@ -2,10 +2,10 @@
 
 #include <thread>
 
+#include "interpreter/AllowThreadsGuard.h"
+#include "interpreter/GilStateGuard.h"
+#include "interpreter/InterpreterLockHeld.h"
 #include "support/embedded_python.h"
-#include "upload/AllowThreadsGuard.h"
-#include "upload/GilStateGuard.h"
-#include "upload/InterpreterLockHeld.h"
 
 namespace {
 

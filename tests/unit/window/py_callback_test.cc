@@ -4,9 +4,9 @@
 
 #include <thread>
 
+#include "interpreter/AllowThreadsGuard.h"
 #include "support/embedded_python.h"
 #include "support/python_objects.h"
-#include "upload/AllowThreadsGuard.h"
 
 namespace {
 

@@ -1,8 +1,8 @@
 #include <Python.h>
 
-#include "upload/AllowThreadsGuard.h"
+#include "interpreter/AllowThreadsGuard.h"
 
-#include "upload/InterpreterLockHeld.h"
+#include "interpreter/InterpreterLockHeld.h"
 
 void* AllowThreadsGuard::ReleaseInterpreterLock() {
   return InterpreterLockHeld() ? PyEval_SaveThread() : nullptr;
