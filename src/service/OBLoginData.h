@@ -11,6 +11,7 @@
 #include <string>
 
 #include "platform/operation_gate.h"
+#include "platform/windows_names.h"
 #include "service/ServiceHosts.h"
 
 namespace http {
@@ -19,11 +20,6 @@ class Probe;
 namespace xml {
 class Document;
 }
-
-typedef void* HINTERNET;  // a connection handle of the reachability probe
-typedef int BOOL;
-
-inline constexpr std::size_t kMaxPath = 260;
 
 class OBLoginData {
  public:
