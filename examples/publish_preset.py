@@ -2,7 +2,9 @@
 """Publishes an adjustment preset to the community service, with a progress bar.
 
 Signs in, lists the preset categories, makes a preset file and twelve preview
-images on the spot, and uploads them. Ctrl-C cancels the upload.
+images on the spot, and uploads them. On a terminal the progress bar is
+redrawn in place; into a log or a pipe it writes a line per tenth of the upload.
+Ctrl-C cancels the upload.
 
     publish_preset.py [--account NAME] [--password PW] [--preset-mb N]
 """
@@ -52,10 +54,76 @@ def make_preset(folder, preset_mb):
     return preset, images
 
 
+def bar_text(percent, status):
+    filled = BAR_WIDTH * max(0, min(percent, 100)) // 100
+    return "[%s%s] %3d%%  %s" % ("#" * filled, "." * (BAR_WIDTH - filled), percent, status)
+
+
+def time_left(half_seconds_left):
+    return "about %ds left for this file" % ((half_seconds_left + 1) // 2)
+
+
+class TerminalBar(object):
+    """One line redrawn in place; the rest of the line is cleared each time, so
+    a shorter text leaves nothing of a longer one behind."""
+
+    CLEAR_TO_END = "\x1b[K"
+
+    def __init__(self, out):
+        self.out = out
+        self.percent = None
+        self.cancelling = False
+
+    def progress(self, percent, half_seconds_left):
+        self.percent = percent
+        self.draw(time_left(half_seconds_left))
+
+    def cancel(self):
+        self.cancelling = True
+        self.draw(None)
+
+    def draw(self, status):
+        if self.cancelling:
+            status = "Cancelling..."
+        self.out.write("\r" + bar_text(self.percent or 0, status) + self.CLEAR_TO_END)
+        self.out.flush()
+
+    def outcome(self, line):
+        if self.percent is not None:
+            self.out.write("\n")
+        self.out.write(line + "\n")
+        self.out.flush()
+
+
+class LogLines(object):
+    """For a log or a pipe: a line each time the upload enters the next tenth."""
+
+    def __init__(self, out):
+        self.out = out
+        self.tenth = None
+
+    def progress(self, percent, half_seconds_left):
+        tenth = max(0, min(percent, 100)) // 10
+        if self.tenth is None or tenth > self.tenth:
+            self.tenth = tenth
+            self.line(bar_text(percent, time_left(half_seconds_left)))
+
+    def cancel(self):
+        self.line("Cancelling...")
+
+    def outcome(self, line):
+        self.line(line)
+
+    def line(self, text):
+        self.out.write(text + "\n")
+        self.out.flush()
+
+
 class ProgressReport(object):
     """Receives the uploader's reports on this (the main) thread."""
 
-    def __init__(self):
+    def __init__(self, display):
+        self.display = display
         self.done = False
         self.success = False
         self.url = u""
@@ -63,20 +131,12 @@ class ProgressReport(object):
 
     def __call__(self, kind, event, percent, *rest):
         if event == u"ProgressChanged":
-            self.draw(percent, rest[0])
+            self.display.progress(percent, rest[0])
         elif event == u"UploadComplete":
             self.done = True
             self.success, self.url, self.error = bool(rest[0]), rest[1], rest[2]
-            self.draw(percent, 0)
-            sys.stdout.write("\n")
-
-    @staticmethod
-    def draw(percent, half_seconds_left):
-        filled = BAR_WIDTH * max(0, min(percent, 100)) // 100
-        sys.stdout.write("\r[%s%s] %3d%%  about %ds left for this file "
-                         % ("#" * filled, "." * (BAR_WIDTH - filled), percent,
-                            (half_seconds_left + 1) // 2))
-        sys.stdout.flush()
+            if self.success:
+                self.display.progress(percent, 0)
 
 
 def sign_in(args):
@@ -95,7 +155,8 @@ def choose_category(session):
 
 
 def wait_for(report, uploader):
-    """Runs Python on the main thread until the completion report has arrived.
+    """Runs Python on the main thread until the completion report has arrived;
+    returns whether a cancel was asked for.
 
     Ctrl-C only notes the wish to cancel: an interrupt raised anywhere else, in
     the middle of a report for instance, could lose the completion."""
@@ -107,10 +168,23 @@ def wait_for(report, uploader):
             time.sleep(0.05)  # reports are delivered between Python instructions
             if interrupts and not cancelled:
                 cancelled = True
-                sys.stdout.write("\nCancelling...\n")
+                report.display.cancel()
                 uploader.CancelUpload()
+        return cancelled
     finally:
         signal.signal(signal.SIGINT, previous)
+
+
+def outcome_line(report, cancelled):
+    """What became of the upload. The completion report tells success and the
+    service's error text; a failure without one, after Ctrl-C, is the cancel."""
+    if report.success:
+        return u"Published: %s" % report.url
+    if report.error:
+        return u"Failed: %s" % report.error
+    if cancelled:
+        return u"Cancelled"
+    return u"Failed: no reason was reported (the service could not be reached or sent none)"
 
 
 def main():
@@ -128,20 +202,18 @@ def main():
         preset, images = make_preset(folder, args.preset_mb)
         uploader = PyPresetUploader(session.GetServerUrl(), session.GetLoginTokenID(),
                                     VERSION, VERSION_TYPE, MACHINE_ID)
-        report = ProgressReport()
+        display = TerminalBar(sys.stdout) if sys.stdout.isatty() else LogLines(sys.stdout)
+        report = ProgressReport(display)
         uploader.SetCallback(report)
         if not uploader.StartUpload(preset, images, u"golden-hour", u"Golden hour",
                                     category, u"warm,sunset", u"Soft warm light for evenings"):
             sys.exit("The upload could not be started.")
-        wait_for(report, uploader)
+        cancelled = wait_for(report, uploader)
     finally:
         shutil.rmtree(folder, ignore_errors=True)
 
-    if report.success:
-        print(u"Published: %s" % report.url)
-        return 0
-    print(u"Not published%s" % (u": " + report.error if report.error else u" (cancelled or failed)"))
-    return 1
+    display.outcome(outcome_line(report, cancelled).encode("utf-8"))
+    return 0 if report.success else 1
 
 
 if __name__ == "__main__":

@@ -10,7 +10,8 @@ MiB = 1024 * KiB
 GiB = 1024 * MiB
 
 CHUNK_LOG_VARIABLE = 'PYUPLOADER_CHUNK_LOG'
-PAUSE_AFTER_CHUNK = 0.050  # the engine's pause after every chunk it writes
+CHUNK_PAUSE_VARIABLE = 'PYUPLOADER_CHUNK_PAUSE_MS'
+PAUSE_AFTER_CHUNK = 0.050  # the engine's pause after every chunk it writes, unless set
 UI_TURN = 0.010  # how long the benchmarks' main thread sleeps between turns
 
 # The uploader's constructor arguments, as a signed-in session would give them.
@@ -65,9 +66,9 @@ def read_chunk_log(path):
                 (line.split() for line in log if line.strip())]
 
 
-def pacing_floor(chunks):
+def pacing_floor(chunks, pause=PAUSE_AFTER_CHUNK):
     """The time the pacing itself takes: every write and every pause after it."""
-    return sum(seconds for _, seconds in chunks) + PAUSE_AFTER_CHUNK * len(chunks)
+    return sum(seconds for _, seconds in chunks) + pause * len(chunks)
 
 
 class Completion(object):

@@ -17,7 +17,7 @@ import time
 
 import bench_support as bs
 from PyUploader import PyPresetUploader
-from refservice import RefService
+from fixtures import RefService
 
 ALLOWANCE = 0.100  # above the write time of the chunk in flight
 EARLIEST_CANCEL = 0.5  # seconds after the start: the preset file is streaming

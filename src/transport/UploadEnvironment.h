@@ -7,6 +7,7 @@
 #include <memory>
 
 #include "platform/win_error.h"
+#include "transport/ChunkPause.h"
 #include "transport/UploadConnection.h"
 
 class UploadProgress;
@@ -21,7 +22,8 @@ struct UploadEnvironment {
   std::function<std::uint32_t()> tickCount;  // milliseconds, wrapping at 2^32
   std::function<void(std::uint32_t)> sleep;  // milliseconds
   UploadConnectionOpener openConnection;
+  std::uint32_t pauseAfterChunkMs = ChunkPause::kDefaultMs;
 
-  // The steady clock, a real sleep and HTTP on port 80.
+  // The steady clock, a real sleep, HTTP on port 80 and the default pause.
   static UploadEnvironment Platform();
 };

@@ -63,9 +63,6 @@ struct Uploader::Totals {
   std::uint32_t size = 0;
 };
 
-Uploader::Uploader(UploadProgress* listener, UploadRequest* request, UploadResult* result)
-    : Uploader(listener, request, result, UploadEnvironment::Platform()) {}
-
 Uploader::Uploader(UploadProgress* listener, UploadRequest* request, UploadResult* result,
                    UploadEnvironment environment)
     : listener(listener), request(request), result(result), environment_(std::move(environment)) {}
@@ -190,7 +187,7 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
     chunk = NextChunkSize(chunk, writeMs);
     sent += static_cast<std::uint32_t>(count);
     totals.sent += static_cast<std::uint32_t>(count);
-    environment_.sleep(kPauseAfterChunkMs);
+    environment_.sleep(environment_.pauseAfterChunkMs);
     const std::uint32_t now = CurrentTick();
     if (now != lastTick) {
       estimate = Remaining(size - sent, totals.size - totals.sent, Divide(sent, now - startTick));

@@ -30,10 +30,8 @@ class Uploader {
   // A write faster than this doubles the chunk; slower than kSlowWrite halves it.
   static constexpr std::uint32_t kFastWriteMs = 500;
   static constexpr std::uint32_t kSlowWriteMs = 1250;
-  static constexpr std::uint32_t kPauseAfterChunkMs = 50;
   static constexpr std::uint32_t kMsPerTick = 500;
 
-  Uploader(UploadProgress* listener, UploadRequest* request, UploadResult* result);
   Uploader(UploadProgress* listener, UploadRequest* request, UploadResult* result,
            UploadEnvironment environment);
   virtual ~Uploader();

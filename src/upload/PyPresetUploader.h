@@ -94,6 +94,7 @@ class PyPresetUploader : public PyCallbackWnd, public BackgroundUploadProgress {
   const std::string uuid;
   const std::string version;
   const std::string versionType;
+  std::uint32_t chunkPauseMs;  // read with the trace switch, at construction
 
   std::wstring uploadedUrl;
   // Touched by the UI thread only while no worker runs, or after the join.

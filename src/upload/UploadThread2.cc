@@ -8,8 +8,8 @@
 #include "transport/Uploader.h"
 
 UploadThread2::UploadThread2(UploadRequest* request, UploadResult* result,
-                             BackgroundUploadProgress* listener)
-    : request(request), result(result), listener(listener) {}
+                             BackgroundUploadProgress* listener, std::uint32_t chunkPauseMs)
+    : request(request), result(result), listener(listener), chunkPauseMs(chunkPauseMs) {}
 
 std::uint32_t UploadThread2::Run() {
   const win::Status status = RunUpload();
@@ -23,7 +23,9 @@ std::uint32_t UploadThread2::Run() {
 // cannot be had, and the completion is still reported.
 win::Status UploadThread2::RunUpload() {
   try {
-    Uploader uploader(listener, request, result);
+    UploadEnvironment environment = UploadEnvironment::Platform();
+    environment.pauseAfterChunkMs = chunkPauseMs;
+    Uploader uploader(listener, request, result, std::move(environment));
     const win::Status status = uploader.Upload();
     reply = std::move(uploader.reply);
     return status;

@@ -14,8 +14,10 @@ struct UploadResult;
 
 class UploadThread2 : public Thread {
  public:
-  // None of the three is owned; all must outlive the thread's run.
-  UploadThread2(UploadRequest* request, UploadResult* result, BackgroundUploadProgress* listener);
+  // None of the three is owned; all must outlive the thread's run. The engine
+  // pauses `chunkPauseMs` after each chunk.
+  UploadThread2(UploadRequest* request, UploadResult* result, BackgroundUploadProgress* listener,
+                std::uint32_t chunkPauseMs);
   ~UploadThread2() override = default;
 
   // The server's reply body; read it only after Join has returned.
@@ -30,5 +32,6 @@ class UploadThread2 : public Thread {
   UploadRequest* request;
   UploadResult* result;
   BackgroundUploadProgress* listener;
+  std::uint32_t chunkPauseMs;
   std::string reply;
 };

@@ -14,10 +14,8 @@ import weakref
 import _PyUploaderTestPeer as peer
 import _PyUploader as native
 import PyUploader
-from refservice import (DETECTION_HOST, SERVER_HOST, STAGING_HOST, RefService, wait_until,
-                        xml_reply)
-from trace_support import TraceRun
-from upload_support import Reports, UploadTest, new_uploader, pump
+from fixtures import (DETECTION_HOST, SERVER_HOST, STAGING_HOST, Reports, Test, UploadTest, pump,
+                      wait_until, xml_reply)
 
 DROP_ROUNDS = 300
 QUIET_LIMIT = 10  # seconds without a round ending; a round takes some milliseconds
@@ -32,15 +30,18 @@ REFUSING_HOST = STAGING_HOST  # taken down: its uploads complete at once, with a
 # a random pause. Afterwards no report may arrive, no worker may be left and the
 # callable must be let go.
 DROPS = r'''
-import os, random, sys, threading, time
-from upload_support import PresetFiles, Reports, TEXTS, new_uploader, worker_threads
+import os, random, sys, tempfile, threading, time
+from fixtures import SESSION, TEXTS, Reports, threads_and_descriptors
+from PyUploader import PyPresetUploader
 
 ROUNDS, SERVING, REFUSING = int(sys.argv[1]), sys.argv[2], sys.argv[3]
 ROUND_LIMIT = 5.0
 TRACE = os.environ['PYUPLOADER_DEBUG_OUTPUT']
-files = PresetFiles(preset_size=2000, image_sizes=[700] * 12)
-texts = [TEXTS[k] for k in ('templateKey', 'title', 'category', 'tags', 'description')]
-threads_before = worker_threads()
+folder = tempfile.mkdtemp()
+files = [os.path.join(folder, str(i)) for i in range(13)]
+for path in files:
+    open(path, 'wb').write(os.urandom(700))
+threads_before = threads_and_descriptors()[0]
 
 
 def trace_size():
@@ -75,9 +76,9 @@ for number in range(ROUNDS):
     name, host, moment = MOMENTS[number % len(MOMENTS)]
     state = dict(trace=trace_size(), progress=False, completing=False)
     reports = Reports(then=lambda reports, report: note(state, report))
-    holder = [new_uploader(serverHost=unicode(host))]
+    holder = [PyPresetUploader(unicode(host), *SESSION[1:])]
     holder[0].SetCallback(reports)
-    assert holder[0].StartUpload(files.preset, files.images, *texts) == 1
+    assert holder[0].StartUpload(files[0], files[1:], *TEXTS) == 1
     dropper = threading.Thread(target=drop, args=(holder, moment, state))
     dropper.start()
     deadline = time.time() + ROUND_LIMIT
@@ -91,9 +92,8 @@ for number in range(ROUNDS):
     assert sys.getrefcount(reports) == 2, 'the callable is still held'
     sys.stdout.write('%d %s\n' % (number, name))
     sys.stdout.flush()
-files.remove()
 deadline = time.time() + ROUND_LIMIT  # ended threads leave the process soon after
-while worker_threads() != threads_before:
+while threads_and_descriptors()[0] != threads_before:
     assert time.time() < deadline, 'a worker thread is left'
 '''
 
@@ -119,16 +119,12 @@ def run_watched(code, args, environment, quiet_limit):
         return child.returncode, out.read(), err.read()
 
 
-class UploaderDroppedOnAnotherThread(unittest.TestCase):
+class UploaderDroppedOnAnotherThread(Test):
 
     def test_drops_in_the_join_the_reports_and_the_callables_neither_hang_nor_crash(self):
-        svc = RefService()
-        svc.reset()
-        svc.host_state(REFUSING_HOST, 'down')
-        with TraceRun(1) as trace:
-            code, out, err = run_watched(DROPS, [str(DROP_ROUNDS), SERVER_HOST, REFUSING_HOST],
-                                         trace.environment(), QUIET_LIMIT)
-        svc.reset()
+        self.svc.host_state(REFUSING_HOST, 'down')
+        code, out, err = run_watched(DROPS, [str(DROP_ROUNDS), SERVER_HOST, REFUSING_HOST],
+                                     dict(os.environ), QUIET_LIMIT)
         self.assertEqual(code, 0, 'status %d after %d rounds: %s' % (code, out.count('\n'), err))
         self.assertEqual(out.count('\n'), DROP_ROUNDS)
 
@@ -140,7 +136,7 @@ SERVICE_INFO = '<INFO><APIUrl>%s</APIUrl></INFO>' % SERVER_HOST
 ANSWER_DELAY = 1.0  # seconds the service keeps the operation waiting
 
 
-class SessionDeletedWhileItWorks(unittest.TestCase):
+class SessionDeletedWhileItWorks(Test):
     # operation, its arguments, the exchange it waits in, its result
     OPERATIONS = [
         ('LoginOrbishare', (u'member', u'secret'), SERVER_HOST, '/servlet/memLogin',
@@ -149,7 +145,7 @@ class SessionDeletedWhileItWorks(unittest.TestCase):
     ]
 
     def test_deleting_waits_for_the_operation_running_on_another_thread(self):
-        svc = RefService()
+        svc = self.svc
         for name, args, host, path, answer, result in self.OPERATIONS:
             svc.reset()
             svc.script(host, path, [xml_reply(answer, delay=ANSWER_DELAY)])
@@ -180,7 +176,7 @@ class CallableLetGoDuringItsCall(UploadTest):
 
     def test_the_callable_lives_until_its_call_has_returned_and_no_longer(self):
         for way, let_go in self.WAYS:
-            holder = [new_uploader()]
+            holder = [self.new_uploader()]
             alive_after = []
 
             def once(*report):

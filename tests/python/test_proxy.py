@@ -11,8 +11,7 @@ import tempfile
 import unittest
 
 import _PyUploader as native
-from refservice import DETECTION_HOST, SERVER_HOST, wait_until
-from upload_support import UPLOAD_PATH, UploadTest, wait_for_completion
+from fixtures import DETECTION_HOST, SERVER_HOST, UPLOAD_PATH, UploadTest, wait_until
 
 PROXY_PORT = 8888
 PROXY_URL = 'http://127.0.0.1:%d' % PROXY_PORT
@@ -62,17 +61,11 @@ class ProxyTest(UploadTest):
         shutil.rmtree(cls.folder, ignore_errors=True)
 
     def setUp(self):
-        UploadTest.setUp(self)
-        self.saved_environment = dict(os.environ)
+        UploadTest.setUp(self)  # which restores the environment afterwards
         os.environ.update(http_proxy=PROXY_URL, https_proxy=PROXY_URL)
         self.session = native.new_OBLoginData(u'5.0', u'Retail', u'machine-1')
+        self.addCleanup(native.delete_OBLoginData, self.session)
         self.logged_before = len(self.proxied())
-
-    def tearDown(self):
-        native.delete_OBLoginData(self.session)
-        os.environ.clear()
-        os.environ.update(self.saved_environment)
-        UploadTest.tearDown(self)
 
     def call(self, operation, *args):
         return getattr(native, 'OBLoginData_' + operation)(self.session, *args)
@@ -96,7 +89,7 @@ class ThroughTheProxy(ProxyTest):
         self.assertEqual(self.call('GetServerUrl'), unicode(SERVER_HOST))
         self.call('GetPresetCategory', u'ENU')
         self.assertEqual(self.start(), 1)
-        self.assertEqual(wait_for_completion(self.reports)[3], 1)
+        self.assertEqual(self.completion()[3], 1)
         methods = [(method, target.split('?')[0]) for method, target in self.proxied_now()]
         self.assertEqual(methods, [
             ('GET', 'http://%s/' % DETECTION_HOST),

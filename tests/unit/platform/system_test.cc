@@ -1,0 +1,163 @@
+// The stand-ins for the operating system's services: the large buffer, links handed to a browser, the debug output and
+// the debug trace with its process-wide switch and prefix.
+#include <dirent.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cstring>
+#include <set>
+#include <sstream>
+
+#include "diag/trace.h"
+#include "platform/debug_output.h"
+#include "platform/large_buffer.h"
+#include "platform/shell.h"
+#include "support/fixtures.h"
+
+namespace {
+
+using namespace test_support;
+using Argv = std::vector<std::string>;
+constexpr auto kPatience = std::chrono::seconds(20);  // only bounds a hang
+
+// The mapping is trimmed to an aligned range: a wrong trim would leave part of
+// a buffer unmapped (a crash when written) or let two buffers overlap.
+TEST(LargeBuffer, EveryByteIsWritableAndBuffersDoNotOverlap) {
+  for (const std::size_t size : {std::size_t{1}, std::size_t{2} << 20, (std::size_t{16} << 20) + 1}) {
+    memory::LargeBuffer first(size), second(size);
+    ASSERT_TRUE(first.data() && second.data());
+    std::memset(first.data(), 'a', size);
+    std::memset(second.data(), 'b', size);
+    EXPECT_EQ(std::count(first.data(), first.data() + size, 'a'), static_cast<long>(size));
+  }
+}
+
+// Recorder scripts in bin/, alone on PATH besides the system folders, write
+// their arguments NUL-separated to "<their path>.out".
+class Links : public TempFolderTest {
+ protected:
+  void SetUp() override {
+    TempFolderTest::SetUp();
+    std::filesystem::create_directory("bin");
+    path_.emplace("PATH", (folder_ / "bin").string() + ":/usr/bin:/bin");
+  }
+  std::string Recorder(const std::string& name) {
+    const std::string path = (folder_ / "bin" / name).string();
+    std::ofstream(path) << "#!/bin/sh\nprintf '%s\\0' \"$@\" > \"$0.tmp\" && mv \"$0.tmp\" \"$0.out\"\n";
+    ::chmod(path.c_str(), 0700);
+    return path;
+  }
+  static Argv RecordedArgs(const std::string& path) {
+    const auto deadline = std::chrono::steady_clock::now() + kPatience;
+    while (!std::filesystem::exists(path + ".out")) {
+      if (std::chrono::steady_clock::now() > deadline) return {"<not started>"};
+      std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    std::istringstream content(ReadFile(path + ".out"));
+    Argv args;
+    for (std::string arg; std::getline(content, arg, '\0');) args.push_back(arg);
+    return args;
+  }
+  std::optional<ScopedEnv> path_;
+  ScopedEnv browser_{"BROWSER", std::nullopt};
+};
+
+std::string Substitute(std::string text, const std::string& from, const std::string& to) {
+  for (std::size_t at = text.find(from); at != std::string::npos; at = text.find(from, at + to.size())) {
+    text.replace(at, from.size(), to);
+  }
+  return text;
+}
+
+TEST_F(Links, TheFirstBrowserCommandThatRunsGetsTheLinkAndNoShellReadsIt) {
+  const std::string recorder = Recorder("recorder");
+  const std::string link = "http://www.orbishare.com/first?a=1&b=%41 'x' $(touch y);z";
+  for (const auto& [browser, expected] : std::vector<std::pair<std::string, Argv>>{
+           {"R", {"L"}}, {"recorder --new-tab", {"--new-tab", "L"}}, {"R --url=%s -x", {"--url=L", "-x"}},
+           {"R 100%% %s", {"100%", "L"}}, {"no-such-browser %s::R", {"L"}}}) {
+    std::filesystem::remove(recorder + ".out");
+    ScopedEnv env("BROWSER", Substitute(browser, "R", recorder));
+    ASSERT_TRUE(shell::OpenLink(std::wstring(link.begin(), link.end())));
+    Argv wanted;
+    for (const std::string& arg : expected) wanted.push_back(Substitute(arg, "L", link));
+    EXPECT_EQ(RecordedArgs(recorder), wanted) << browser;
+  }
+  EXPECT_FALSE(std::filesystem::exists("y")) << "a shell read the link";
+}
+
+int ChildProcesses() {
+  int children = 0;
+  for (const auto& entry : std::filesystem::directory_iterator("/proc")) {
+    std::string line;
+    std::getline(std::ifstream(entry.path() / "stat"), line);
+    if (line.empty()) continue;
+    std::istringstream fields(line.substr(line.rfind(')') + 2));
+    char state = 0;
+    int parent = 0;
+    fields >> state >> parent;
+    children += parent == ::getpid();
+  }
+  return children;
+}
+
+TEST_F(Links, OnlyWebLinksGoToXdgOpenWhichIsReapedAndNoHandlerIsAFailure) {
+  const std::string opener = Recorder("xdg-open");
+  for (const wchar_t* link : {L"file:///etc/passwd", L"javascript:alert(1)", L"ftp://h/x", L"", L"http://",
+                              L"-http://h", L"httpx://h", L"http://h/\na", L"http://h/\x7F"}) {
+    EXPECT_FALSE(shell::OpenLink(link)) << link;
+  }
+  EXPECT_FALSE(std::filesystem::exists(opener + ".out"));
+  ASSERT_TRUE(shell::OpenLink(L"HTTPS://www.orbishare.com/\u00E4"));
+  EXPECT_EQ(RecordedArgs(opener), Argv{"HTTPS://www.orbishare.com/\xC3\xA4"});
+  const auto deadline = std::chrono::steady_clock::now() + kPatience;
+  while (ChildProcesses() > 0 && std::chrono::steady_clock::now() < deadline) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(10));
+  }
+  EXPECT_EQ(ChildProcesses(), 0) << "a zombie is left";
+  std::filesystem::remove(opener);
+  ScopedEnv none("BROWSER", std::string("no-such-browser:also-missing %s"));
+  EXPECT_FALSE(shell::OpenLink(L"http://www.orbishare.com/"));
+}
+
+// Lines from many threads stay whole; each is appended in UTF-8.
+TEST(DebugOutput, LinesStayWholeFromManyThreads) {
+  TraceCapture capture;
+  std::vector<std::thread> writers;
+  for (int t = 0; t < 4; ++t) {
+    writers.emplace_back([t] {
+      for (int i = 0; i < 200; ++i) debug_output::Write(std::to_wstring(t * 1000 + i) + std::wstring(300, L'\u00E4') + L"\n");
+    });
+  }
+  for (auto& w : writers) w.join();
+  std::istringstream lines(capture.Bytes());
+  std::set<std::string> seen;
+  std::string utf8;
+  for (int i = 0; i < 300; ++i) utf8 += "\xC3\xA4";
+  for (std::string line; std::getline(lines, line); seen.insert(line)) ASSERT_EQ(line.substr(line.size() - 600), utf8);
+  EXPECT_EQ(seen.size(), 800u);
+}
+
+TEST(Trace, AnUnopenableKeyKeepsTheStateAndLongNamesKeepThePrefix) {
+  TraceCapture capture;
+  TraceSetPrefix("First");
+  capture.RemoveKey();
+  TraceSetPrefix("Second");
+  TraceMessage(L"still on");
+  capture.SetSwitch(1);
+  for (const char* name : std::vector<const char*>{"", nullptr, "ABCDEFGHIJKLMNOPQRSTUVWXYZ012", "ABCDEFGHIJKLMNOPQRSTUVWXYZ0123"}) {
+    TraceSetPrefix(name);
+    TraceMessage(L"x");
+  }
+  TraceMessage(L"KRV version = %s; host %S; %d%%", L"5.0 \u00E4", "n\xC3\xA4", 7);
+  capture.SetSwitch(0);
+  TraceSetPrefix("Third");
+  capture.RemoveKey();
+  TraceSetPrefix("Fourth");
+  TraceMessage(L"still off");
+  EXPECT_EQ(capture.Bytes(), "[First]still on\n[]x\n[]x\n[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
+                             "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
+                             "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01KRV version = 5.0 \xC3\xA4; host n\xC3\xA4; 7%\n");
+}
+
+}  // namespace
