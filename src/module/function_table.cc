@@ -6,11 +6,11 @@
 //
 // 1. Define it in functions_<Class>.cc (using namespace binding), for example
 //
-//    // Unicode argument, passed-through result (the operation returns a new PyObject*):
-//    PyObject* OBLoginData_GetPresetCategory(PyObject*, PyObject* args) {
-//      return Call(args, "OBLoginData_GetPresetCategory", PassedThrough{},
-//                  [](OBLoginData* self, const wchar_t* language) {
-//                    return self->GetPresetCategory(language);
+//    // Unicode argument, optional text result (None for no text):
+//    PyObject* OBLoginData_GetEffectByGUID(PyObject*, PyObject* args) {
+//      return Call(args, "OBLoginData_GetEffectByGUID", ReturnsUnicodeOrNone{},
+//                  [](OBLoginData* self, const wchar_t* guid) {
+//                    return self->GetEffectByGUID(guid);
 //                  },
 //                  Pointer<OBLoginData>(Type(TypeId::OBLoginData), "OBLoginData *"), Unicode());
 //    }
@@ -35,10 +35,12 @@
 //      NarrowArray<260>("char [_MAX_PATH]")     const std::array<char, 260>&
 //      Object()             PyObject*, borrowed
 //    Result kinds (runtime/result_kinds.h): ReturnsNone{}, ReturnsInt{},
-//      ReturnsUnsigned{}, PassedThrough{}, ReturnsStr{} (the operation returns a
-//      std::string_view of the whole array), NewPointer(type, flags): POINTER_OWN |
-//      POINTER_NOSHADOW for constructors, POINTER_OWN for getters of CString and
-//      HINTERNET members (the operation returns a new heap copy).
+//      ReturnsUnsigned{}, ReturnsUnicode{} (a std::wstring), ReturnsUnicodeOrNone{}
+//      (a std::optional<std::wstring>), ReturnsUnicodeDict{} (a map of wide texts),
+//      PassedThrough{} (the operation returns a new PyObject*), ReturnsStr{} (the
+//      operation returns a std::string_view of the whole array), NewPointer(type,
+//      flags): POINTER_OWN | POINTER_NOSHADOW for constructors, POINTER_OWN for
+//      getters of CString and HINTERNET members (the operation returns a new heap copy).
 //    Delete<T>(args, name, type, "T *") and Register(args, type) are the whole body of
 //    the delete_ and _swigregister functions.
 // 2. Declare it in functions_<Class>.h.

@@ -15,7 +15,7 @@ namespace {
 using namespace binding;
 
 using HandleMember = HINTERNET OBLoginData::*;
-using LinkGetter = PyObject* (OBLoginData::*)();
+using LinkGetter = std::wstring (OBLoginData::*)();
 using UrlBuffer = std::array<char, kMaxPath>;
 
 constexpr char kSessionType[] = "OBLoginData *";
@@ -36,9 +36,9 @@ PyObject* GetHandle(PyObject* args, const char* function, HandleMember member) {
               [member](OBLoginData* self) { return new HINTERNET(self->*member); }, Session());
 }
 
-// A link to a service page, built as a unicode object by the session.
+// A link to a service page.
 PyObject* GetLink(PyObject* args, const char* function, LinkGetter getter) {
-  return Call(args, function, PassedThrough{}, [getter](OBLoginData* self) { return (self->*getter)(); },
+  return Call(args, function, ReturnsUnicode{}, [getter](OBLoginData* self) { return (self->*getter)(); },
               Session());
 }
 
@@ -81,17 +81,17 @@ PyObject* OBLoginData_SetOBURLAsReg(PyObject*, PyObject* args) {
 }
 
 PyObject* OBLoginData_GetUserName(PyObject*, PyObject* args) {
-  return Call(args, "OBLoginData_GetUserName", PassedThrough{},
+  return Call(args, "OBLoginData_GetUserName", ReturnsUnicode{},
               [](OBLoginData* self) { return self->GetUserName(); }, Session());
 }
 
 PyObject* OBLoginData_GetServerUrl(PyObject*, PyObject* args) {
-  return Call(args, "OBLoginData_GetServerUrl", PassedThrough{},
+  return Call(args, "OBLoginData_GetServerUrl", ReturnsUnicode{},
               [](OBLoginData* self) { return self->GetServerUrl(); }, Session());
 }
 
 PyObject* OBLoginData_GetLoginTokenID(PyObject*, PyObject* args) {
-  return Call(args, "OBLoginData_GetLoginTokenID", PassedThrough{},
+  return Call(args, "OBLoginData_GetLoginTokenID", ReturnsUnicode{},
               [](OBLoginData* self) { return self->GetLoginTokenID(); }, Session());
 }
 
@@ -108,8 +108,10 @@ PyObject* OBLoginData_GetLensCorrectionURL(PyObject*, PyObject* args) {
 }
 
 PyObject* OBLoginData_GetPresetCategory(PyObject*, PyObject* args) {
-  return Call(args, "OBLoginData_GetPresetCategory", PassedThrough{},
-              [](OBLoginData* self, const wchar_t* language) { return self->GetPresetCategory(language); },
+  return Call(args, "OBLoginData_GetPresetCategory", ReturnsUnicodeDict{},
+              [](OBLoginData* self, const wchar_t* language) -> const OBLoginData::Categories& {
+                return self->GetPresetCategory(language);
+              },
               Session(), Unicode());
 }
 
@@ -126,7 +128,7 @@ PyObject* OBLoginData_GetCategoryCount(PyObject*, PyObject* args) {
 }
 
 PyObject* OBLoginData_SetRelateVideo(PyObject*, PyObject* args) {
-  return Call(args, "OBLoginData_SetRelateVideo", PassedThrough{},
+  return Call(args, "OBLoginData_SetRelateVideo", ReturnsUnicodeOrNone{},
               [](OBLoginData* self, const wchar_t* videoURL, const wchar_t* website, const wchar_t* videoInfo) {
                 return self->SetRelateVideo(videoURL, website, videoInfo);
               },
@@ -138,7 +140,7 @@ PyObject* OBLoginData_GetPresetDownloadURL(PyObject*, PyObject* args) {
 }
 
 PyObject* OBLoginData_GetEffectByGUID(PyObject*, PyObject* args) {
-  return Call(args, "OBLoginData_GetEffectByGUID", PassedThrough{},
+  return Call(args, "OBLoginData_GetEffectByGUID", ReturnsUnicodeOrNone{},
               [](OBLoginData* self, const wchar_t* guid) { return self->GetEffectByGUID(guid); }, Session(),
               Unicode());
 }

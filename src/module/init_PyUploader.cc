@@ -1,10 +1,12 @@
 // The module's entry point, the only symbol the library exports.
 #include <Python.h>
 
+#include "interpreter/AllowThreadsGuard.h"
 #include "module/function_table.h"
 #include "module/runtime/TypeTable.h"
 #include "module/runtime/exception_barrier.h"
 #include "module/types.h"
+#include "platform/blocking_scope.h"
 #include "platform/http_global.h"
 
 namespace {
@@ -15,10 +17,13 @@ constexpr int kApiVersion = 1013;
 }  // namespace
 
 extern "C" __attribute__((visibility("default"))) void init_PyUploader() {
-  // What loading the library sets up: the HTTP library, and the interpreter lock for
-  // the worker and probe threads.
+  // What loading the library sets up: the HTTP library, the interpreter lock for
+  // the worker and probe threads, and its release during the lower layers'
+  // blocking waits.
   http::GlobalInit();
   PyEval_InitThreads();
+  InstallBlockingRelease(
+      {&AllowThreadsGuard::ReleaseInterpreterLock, &AllowThreadsGuard::RetakeInterpreterLock});
 
   PyObject* module =
       Py_InitModule4(kModuleName, module::FunctionTable(), nullptr, nullptr, kApiVersion);

@@ -4,7 +4,6 @@
 
 #include "diag/trace.h"
 #include "platform/text.h"
-#include "service/UnicodeResult.h"
 
 namespace {
 
@@ -34,11 +33,11 @@ OBLoginData::OBLoginData(const wchar_t* version, const wchar_t* versionType, con
 
 OBLoginData::~OBLoginData() { m_runningOperations.Close(); }
 
-PyObject* OBLoginData::GetUserName() const { return NewUnicodeResult(m_strUserName); }
+std::wstring OBLoginData::GetUserName() const { return m_strUserName; }
 
-PyObject* OBLoginData::GetServerUrl() const { return NewUnicodeResult(m_strServerUrl); }
+std::wstring OBLoginData::GetServerUrl() const { return m_strServerUrl; }
 
-PyObject* OBLoginData::GetLoginTokenID() const { return NewUnicodeResult(GetToken()); }
+std::wstring OBLoginData::GetLoginTokenID() const { return GetToken(); }
 
 int OBLoginData::GetCategoryCount() const { return static_cast<int>(m_mapCategory.size()); }
 

@@ -1,19 +1,18 @@
 // The client session of the community service: server host, the signed-in
 // member's token and details, the service links, the preset categories and the
-// state of the reachability probe. Operations run on the caller's thread with the
-// interpreter lock held; only the token may be read from another thread.
+// state of the reachability probe. Operations run on the caller's thread, one at a
+// time; only the token may be read from another thread.
 #pragma once
 
 #include <cstddef>
 #include <map>
 #include <mutex>
+#include <optional>
 #include <string>
 
+#include "platform/operation_gate.h"
+#include "platform/windows_names.h"
 #include "service/ServiceHosts.h"
-#include "upload/OperationGate.h"
-
-struct _object;
-typedef struct _object PyObject;
 
 namespace http {
 class Probe;
@@ -22,26 +21,22 @@ namespace xml {
 class Document;
 }
 
-typedef void* HINTERNET;  // a connection handle of the reachability probe
-typedef int BOOL;
-
-inline constexpr std::size_t kMaxPath = 260;
-
 class OBLoginData {
  public:
   // Null arguments are taken as empty texts.
   OBLoginData(const wchar_t* version, const wchar_t* versionType, const wchar_t* uuid);
-  // Sends nothing to the service. An operation that runs with the interpreter
-  // lock released on another thread is waited for (with the lock released);
+  // Sends nothing to the service. An operation inside its BlockingScope on
+  // another thread is waited for (in a BlockingScope too);
   // sign-in and discovery begun meanwhile do nothing (sign-in returns 0).
   ~OBLoginData();
   OBLoginData(const OBLoginData&) = delete;
   OBLoginData& operator=(const OBLoginData&) = delete;
 
-  // Accessors for Python: each returns a new unicode object (or the count).
-  PyObject* GetUserName() const;
-  PyObject* GetServerUrl() const;
-  PyObject* GetLoginTokenID() const;
+  using Categories = std::map<std::wstring, std::wstring>;  // decimal category id to name
+
+  std::wstring GetUserName() const;
+  std::wstring GetServerUrl() const;
+  std::wstring GetLoginTokenID() const;
   int GetCategoryCount() const;
 
   // For the service operations: the token is read and written only under m_csToken.
@@ -62,17 +57,19 @@ class OBLoginData {
   // The reachability probe (reachability.cc): nonzero when the URL could be opened.
   BOOL CheckServerReachable(const char* url);
 
-  // Preset categories (categories.cc).
-  PyObject* GetPresetCategory(const wchar_t* language);
+  // Preset categories (categories.cc): every category known so far.
+  const Categories& GetPresetCategory(const wchar_t* language);
   int GetCategroyName(int id, std::wstring& name) const;
-  // Related video (related_video.cc).
-  PyObject* SetRelateVideo(const wchar_t* videoURL, const wchar_t* website, const wchar_t* videoInfo);
-  // Effect lookup (effect_lookup.cc) and the links to the service's pages (links.cc).
-  PyObject* GetEffectByGUID(const wchar_t* guid);
-  PyObject* GetPresetDownloadURL();
-  PyObject* GetSignUpURL();
-  PyObject* GetForgetPasswordURL();
-  PyObject* GetLensCorrectionURL();
+  // Related video (related_video.cc): the video page's address, or nothing.
+  std::optional<std::wstring> SetRelateVideo(const wchar_t* videoURL, const wchar_t* website,
+                                             const wchar_t* videoInfo);
+  // Effect lookup (effect_lookup.cc): nothing without a GUID; and the links to
+  // the service's pages (links.cc).
+  std::optional<std::wstring> GetEffectByGUID(const wchar_t* guid);
+  std::wstring GetPresetDownloadURL();
+  std::wstring GetSignUpURL();
+  std::wstring GetForgetPasswordURL();
+  std::wstring GetLensCorrectionURL();
 
   // The reachability probe's state, also read and written from Python.
   HINTERNET m_hInternet;
@@ -92,7 +89,7 @@ class OBLoginData {
   unsigned int ReadSignInReply(const xml::Document& reply, std::wstring& token,
                                bool& firstLogin);
   void GetVideoID(std::wstring& videoID);
-  PyObject* ServiceLink(std::wstring OBLoginData::*storedLink);
+  std::wstring ServiceLink(std::wstring OBLoginData::*storedLink);
 
   BOOL m_bLoggedIn;
   std::wstring m_strServerUrl;  // bare host name of every service request
@@ -107,10 +104,10 @@ class OBLoginData {
   std::wstring m_strLensCorrectionURL;
   std::wstring m_strVideoGalleryURL;
   std::wstring m_strUuid;
-  std::map<std::wstring, std::wstring> m_mapCategory;  // decimal category id to name
+  Categories m_mapCategory;
   mutable std::mutex m_csToken;
   const ServiceHosts m_hosts;
-  // Passed by the operations that release the interpreter lock, during which
-  // another Python thread may delete the session.
+  // Passed by the operations that open a BlockingScope, during which another
+  // Python thread may delete the session.
   OperationGate m_runningOperations;
 };

@@ -1,8 +1,5 @@
 // Preset categories: the request in the user's language, the walk of the reply
-// into the session's map, and the whole map handed to Python as a dictionary.
-#include <Python.h>
-
-#include <memory>
+// into the session's map, which is returned whole.
 #include <string>
 #include <utility>
 
@@ -10,7 +7,6 @@
 #include "platform/text.h"
 #include "platform/xml.h"
 #include "service/OBLoginData.h"
-#include "service/UnicodeResult.h"
 #include "service/reply_walk.h"
 #include "service/server_request.h"
 
@@ -26,7 +22,7 @@ constexpr int kMostCategoriesPerReply = 10000;
 
 // Adds the reply's categories to the map, replacing the names of known ids;
 // past the bound the rest of the reply is ignored.
-void AddCategories(const xml::Document& reply, std::map<std::wstring, std::wstring>& categories) {
+void AddCategories(const xml::Document& reply, OBLoginData::Categories& categories) {
   int taken = 0;
   for (const xml::Node& list : ChildrenNamed(reply.Top(), kCategoriesElement)) {
     for (const xml::Node& category : ChildrenNamed(list, kCategoryElement)) {
@@ -43,35 +39,9 @@ void AddCategories(const xml::Document& reply, std::map<std::wstring, std::wstri
   }
 }
 
-// A failure to build the dictionary's items ends the filling; the entries made so
-// far are returned, as the caller asked for what is known, not for an exception.
-void FillDictionary(PyObject* dictionary, const std::map<std::wstring, std::wstring>& categories) {
-  for (const auto& [id, name] : categories) {
-    PyObject* key = NewUnicodeResult(id);
-    PyObject* value = NewUnicodeResult(name);
-    const bool stored = key && value && PyDict_SetItem(dictionary, key, value) == 0;
-    Py_XDECREF(key);
-    Py_XDECREF(value);
-    if (!stored) {
-      PyErr_Clear();
-      return;
-    }
-  }
-}
-
-struct PythonReference {
-  void operator()(PyObject* object) const { Py_DECREF(object); }
-};
-
 }  // namespace
 
-PyObject* OBLoginData::GetPresetCategory(const wchar_t* language) {
-  // Owned until returned: a failure (an exception) on the way must not leak it.
-  std::unique_ptr<PyObject, PythonReference> dictionary(PyDict_New());
-  if (!dictionary) {
-    PyErr_Clear();
-    Py_RETURN_NONE;
-  }
+const OBLoginData::Categories& OBLoginData::GetPresetCategory(const wchar_t* language) {
   EnsureServerUrl();
   const std::wstring path =
       QueryPath(kCategoryServlet, {{L"Locid", text::WideView(language)}, {L"Version", m_strVersion}});
@@ -79,8 +49,7 @@ PyObject* OBLoginData::GetPresetCategory(const wchar_t* language) {
   if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
     AddCategories(xml::Document(std::move(*reply)), m_mapCategory);
   }
-  FillDictionary(dictionary.get(), m_mapCategory);
-  return dictionary.release();
+  return m_mapCategory;
 }
 
 int OBLoginData::GetCategroyName(int id, std::wstring& name) const {

@@ -5,11 +5,11 @@
 #include <string_view>
 
 #include "diag/trace.h"
+#include "platform/blocking_scope.h"
 #include "platform/text.h"
 #include "platform/xml.h"
 #include "service/OBLoginData.h"
 #include "service/exchange.h"
-#include "upload/AllowThreadsGuard.h"
 
 namespace {
 
@@ -43,7 +43,7 @@ void OBLoginData::InitOBServerURL() {
   // Ends last: after every use of the session, with the lock taken back.
   const OperationGate::Pass running(m_runningOperations);
   if (!running) return;
-  AllowThreadsGuard unlocked;
+  const BlockingScope blocking;
   EnsureServerUrl();
 }
 

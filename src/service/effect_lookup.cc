@@ -1,12 +1,10 @@
 // Effect lookup: where the picture-in-picture effect with a GUID is downloaded.
-#include <Python.h>
-
+#include <optional>
 #include <string>
 #include <utility>
 
 #include "platform/xml.h"
 #include "service/OBLoginData.h"
-#include "service/UnicodeResult.h"
 #include "service/reply_walk.h"
 #include "service/server_request.h"
 #include "service/unescape_url.h"
@@ -28,8 +26,8 @@ std::wstring EffectAddress(const xml::Document& reply) {
 
 }  // namespace
 
-PyObject* OBLoginData::GetEffectByGUID(const wchar_t* guid) {
-  if (!guid) Py_RETURN_NONE;
+std::optional<std::wstring> OBLoginData::GetEffectByGUID(const wchar_t* guid) {
+  if (!guid) return std::nullopt;
   // Signed out, the token is empty and sent as such.
   const std::wstring token = GetToken();
   EnsureServerUrl();
@@ -38,5 +36,5 @@ PyObject* OBLoginData::GetEffectByGUID(const wchar_t* guid) {
   if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
     address = EffectAddress(xml::Document(std::move(*reply)));
   }
-  return NewUnicodeResult(UnescapeUrl(address));
+  return UnescapeUrl(address);
 }

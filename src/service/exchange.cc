@@ -1,7 +1,6 @@
 #include "service/exchange.h"
 
 #include <algorithm>
-#include <new>
 #include <utility>
 
 #include "platform/http.h"
@@ -40,16 +39,12 @@ bool MayNotStandInTarget(unsigned char byte) {
 }  // namespace
 
 std::optional<std::string> RunExchange(const ServiceRequest& what) {
-  try {
-    const http::Session session(what.agent);
-    const http::Connection connection(session, text::WideToUtf8(what.host),
-                                      PortOf(what.transport), SchemeOf(what.transport));
-    http::Request request(connection, what.verb, text::WideToUtf8(what.path));
-    if (!SendRequest(request, what)) return std::nullopt;
-    return ReadReply(request, what.read);
-  } catch (const std::bad_alloc&) {
-    return std::nullopt;
-  }
+  const http::Session session(what.agent);
+  const http::Connection connection(session, text::WideToUtf8(what.host),
+                                    PortOf(what.transport), SchemeOf(what.transport));
+  http::Request request(connection, what.verb, text::WideToUtf8(what.path));
+  if (!SendRequest(request, what)) return std::nullopt;
+  return ReadReply(request, what.read);
 }
 
 std::string DecodeUtf8Reply(std::string bytes) {

@@ -4,13 +4,13 @@
 #include <string>
 
 #include "diag/trace.h"
+#include "platform/blocking_scope.h"
 #include "platform/shell.h"
 #include "platform/text.h"
 #include "platform/xml.h"
 #include "service/OBLoginData.h"
 #include "service/escape_form_value.h"
 #include "service/exchange.h"
-#include "upload/AllowThreadsGuard.h"
 
 namespace {
 
@@ -47,7 +47,7 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
   // Ends last: after every use of the session, with the lock taken back.
   const OperationGate::Pass running(m_runningOperations);
   if (!running) return 0;
-  AllowThreadsGuard unlocked;
+  const BlockingScope blocking;
   EnsureServerUrl();
   const std::string probeUrl = "http://" + text::WideToUtf8(m_hosts.defaultHost);
   if (!CheckServerReachable(probeUrl.c_str())) {

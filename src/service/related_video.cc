@@ -1,8 +1,6 @@
 // Related video: a fresh video identifier for the signed-in member, then the
 // registration of the video's address under it; the service answers with the
 // address of the video's page.
-#include <Python.h>
-
 #include <optional>
 #include <string>
 #include <utility>
@@ -10,7 +8,6 @@
 #include "diag/trace.h"
 #include "platform/xml.h"
 #include "service/OBLoginData.h"
-#include "service/UnicodeResult.h"
 #include "service/server_request.h"
 
 namespace {
@@ -31,21 +28,22 @@ std::optional<std::wstring> ReplyField(std::optional<std::string> reply, const c
 
 }  // namespace
 
-PyObject* OBLoginData::SetRelateVideo(const wchar_t* videoURL, const wchar_t* website, const wchar_t* videoInfo) {
+std::optional<std::wstring> OBLoginData::SetRelateVideo(const wchar_t* videoURL, const wchar_t* website,
+                                                        const wchar_t* videoInfo) {
   if (!videoURL || !website || !videoInfo) {
     TraceMessage(L"SetRelateVideo wszVideoURL|wszWebsite|wszVideoInfo fail");
-    Py_RETURN_NONE;
+    return std::nullopt;
   }
   const std::wstring token = GetToken();
   if (token.empty()) {
     TraceMessage(L"SetRelateVideo GetTokenID fail");
-    Py_RETURN_NONE;
+    return std::nullopt;
   }
   std::wstring videoID;
   GetVideoID(videoID);
   if (videoID.empty()) {
     TraceMessage(L"SetRelateVideo GetVideoID fail");
-    Py_RETURN_NONE;
+    return std::nullopt;
   }
   EnsureServerUrl();
   // The details are a ready-made query fragment and come last.
@@ -58,10 +56,8 @@ PyObject* OBLoginData::SetRelateVideo(const wchar_t* videoURL, const wchar_t* we
                                                             {L"versionType", m_strVersionType},
                                                             {L"uuid", m_strUuid}}) +
                             L'&' + service::EscapePathValue(videoInfo);
-  const auto videoPage =
-      ReplyField(PostToServer(m_strServerUrl, path, service::ReplyRead::kToEnd, ReplyCoding::kAnsi), kVideoUrlPath);
-  if (!videoPage) Py_RETURN_NONE;
-  return NewUnicodeResult(*videoPage);
+  return ReplyField(PostToServer(m_strServerUrl, path, service::ReplyRead::kToEnd, ReplyCoding::kAnsi),
+                    kVideoUrlPath);
 }
 
 void OBLoginData::GetVideoID(std::wstring& videoID) {

@@ -11,10 +11,6 @@ struct ChunkPause {
   static constexpr std::uint32_t kDefaultMs = 50;
   static constexpr std::uint32_t kLongestMs = 1000;
 
-  // The setting in milliseconds, read now. Unset: the default. Anything but
-  // decimal digits up to kLongestMs: the default, and one trace line naming
-  // the refused value.
-  static std::uint32_t FromEnvironment();
   // The milliseconds that `text` gives, or nothing when it is refused.
   static std::optional<std::uint32_t> Parse(const char* text);
 };

@@ -8,6 +8,7 @@
 #include <memory>
 #include <string>
 
+#include "platform/windows_names.h"
 #include "transport/BackgroundUploadProgress.h"
 
 namespace ui {
@@ -17,7 +18,6 @@ class Command;
 
 class CUploadProgressProxyWindow final : public BackgroundUploadProgress {
  public:
-  static constexpr std::uint32_t WM_APP = 0x8000;
   static constexpr std::uint32_t WM_UPLOAD_COMMAND = WM_APP + 42;
   // eventFilter bits: which of the two request notifications are forwarded.
   static constexpr std::uint32_t kForwardSendingRequest = 1u << 0;

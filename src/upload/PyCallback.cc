@@ -5,7 +5,7 @@
 #include <cstring>
 #include <string>
 
-#include "upload/GilStateGuard.h"
+#include "interpreter/GilStateGuard.h"
 
 PyCallback::~PyCallback() { SetCallback(nullptr); }
 

@@ -2,18 +2,19 @@
 
 #include "upload/PyPresetUploader.h"
 
+#include <cstdlib>
 #include <new>
 #include <string_view>
 
 #include "diag/trace.h"
+#include "interpreter/AllowThreadsGuard.h"
+#include "interpreter/OnInterpreterMainThread.h"
 #include "platform/file.h"
 #include "platform/text.h"
 #include "platform/xml.h"
 #include "service/unescape_url.h"
 #include "transport/ChunkPause.h"
 #include "transport/WideToUtf8.h"
-#include "upload/AllowThreadsGuard.h"
-#include "upload/OnInterpreterMainThread.h"
 
 namespace {
 
@@ -58,6 +59,21 @@ int Percentage(std::uint32_t sent, std::uint32_t total) {
   return static_cast<int>(static_cast<float>(sent) / static_cast<float>(total) * 100.0);
 }
 
+// The pause setting in milliseconds, read now. Unset: the default. Anything but
+// decimal digits up to ChunkPause::kLongestMs: the default, and one trace line
+// naming the refused value.
+std::uint32_t ChunkPauseFromEnvironment() {
+  const char* value = std::getenv(ChunkPause::kVariable);
+  if (value == nullptr) return ChunkPause::kDefaultMs;
+  if (const auto pause = ChunkPause::Parse(value)) return *pause;
+  // Wide first: a value that is not UTF-8 still shows, with replacement characters.
+  const std::wstring shown = text::Utf8ToWide(value);
+  TraceMessage(L"%S refused: \"%s\" is not a whole number of milliseconds from 0 to %u;"
+               L" the pause stays %u ms",
+               ChunkPause::kVariable, shown.c_str(), ChunkPause::kLongestMs, ChunkPause::kDefaultMs);
+  return ChunkPause::kDefaultMs;
+}
+
 }  // namespace
 
 PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* token,
@@ -70,7 +86,7 @@ PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* tok
       versionType(Narrow(versionType)) {
   TraceSetPrefix(kTraceName);
   // After the prefix: a refused setting is traced behind this object's name.
-  chunkPauseMs = ChunkPause::FromEnvironment();
+  chunkPauseMs = ChunkPauseFromEnvironment();
 }
 
 PyPresetUploader::~PyPresetUploader() {

@@ -14,7 +14,7 @@
 #include "transport/UploadRequest.h"
 #include "transport/UploadResult.h"
 #include "upload/CUploadProgressProxyWindow.h"
-#include "upload/OperationGate.h"
+#include "platform/operation_gate.h"
 #include "upload/PyCallbackWnd.h"
 #include "upload/UploadThread2.h"
 

@@ -130,6 +130,29 @@ size_t TrimTrailingZeros(const char* bytes, size_t size) {
   return size;
 }
 
+PyObject* FromWide(std::wstring_view text) {
+  const wchar_t* characters = text.empty() ? L"" : text.data();
+  return PyUnicode_FromWideChar(characters, static_cast<Py_ssize_t>(text.size()));
+}
+
+PyObject* FromWideMap(const std::map<std::wstring, std::wstring>& items) {
+  PyObject* dictionary = PyDict_New();
+  if (!dictionary) {
+    PyErr_Clear();
+    Py_RETURN_NONE;
+  }
+  for (const auto& [key, value] : items) {
+    const PyRef keyObject(FromWide(key));
+    const PyRef valueObject(FromWide(value));
+    if (!keyObject || !valueObject ||
+        PyDict_SetItem(dictionary, keyObject.get(), valueObject.get()) != 0) {
+      PyErr_Clear();
+      break;
+    }
+  }
+  return dictionary;
+}
+
 PyObject* FromUnsigned(uint32_t value) {
   if (value <= kLargestInt) return PyInt_FromLong(static_cast<long>(value));
   return PyLong_FromUnsignedLong(value);

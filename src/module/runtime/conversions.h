@@ -8,6 +8,9 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <map>
+#include <string>
+#include <string_view>
 
 namespace binding {
 
@@ -33,6 +36,12 @@ PyObject* FromNarrowArray(const char* bytes, size_t size);
 
 // The length of `bytes` without its trailing zero bytes.
 size_t TrimTrailingZeros(const char* bytes, size_t size);
+
+// A `unicode` of every character of `text`.
+PyObject* FromWide(std::wstring_view text);
+
+// A `dict` of `unicode` keys and values; see ReturnsUnicodeDict.
+PyObject* FromWideMap(const std::map<std::wstring, std::wstring>& items);
 
 // An `int` below 0x80000000, a `long` from there on.
 PyObject* FromUnsigned(uint32_t value);

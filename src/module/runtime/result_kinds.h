@@ -5,6 +5,9 @@
 #include <Python.h>
 
 #include <cstdint>
+#include <map>
+#include <optional>
+#include <string>
 #include <string_view>
 
 #include "module/runtime/TypeInfo.h"
@@ -24,6 +27,28 @@ struct ReturnsInt {
 // An `int` below 0x80000000, else a `long`.
 struct ReturnsUnsigned {
   PyObject* Make(uint32_t value) const { return FromUnsigned(value); }
+};
+
+// A `unicode` of every character of the text, zero characters included.
+struct ReturnsUnicode {
+  PyObject* Make(std::wstring_view text) const { return FromWide(text); }
+};
+
+// None for no text, else as ReturnsUnicode.
+struct ReturnsUnicodeOrNone {
+  PyObject* Make(const std::optional<std::wstring>& text) const {
+    if (!text) Py_RETURN_NONE;
+    return FromWide(*text);
+  }
+};
+
+// A `dict` of `unicode` keys and values. The caller asked for what is known, not for
+// an exception: None when the dictionary cannot be made, and the items made so far
+// when one of them cannot be.
+struct ReturnsUnicodeDict {
+  PyObject* Make(const std::map<std::wstring, std::wstring>& items) const {
+    return FromWideMap(items);
+  }
 };
 
 // The operation built the Python object itself (a new reference, or null with an

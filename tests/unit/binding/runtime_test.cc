@@ -105,4 +105,22 @@ TEST(CallSequence, CopiesMadeBeforeARefusalOrAnExceptionAreFreed) {
   }
 }
 
+// Wide texts reach Python whole: inner zeros and characters beyond the BMP included.
+TEST(ResultKinds, WideTextsBecomeUnicodeWithEveryCharacter) {
+  const std::wstring text(L"m\u00E4\0t\U0001F600", 5);
+  const auto same = [&](PyObject* object) {
+    return object && PyUnicode_CheckExact(object) &&
+           std::wstring(reinterpret_cast<const wchar_t*>(PyUnicode_AS_UNICODE(object)),
+                        PyUnicode_GET_SIZE(object)) == text;
+  };
+  EXPECT_TRUE(same(PyRef(ReturnsUnicode{}.Make(text)).get()));
+  EXPECT_TRUE(same(PyRef(ReturnsUnicodeOrNone{}.Make(text)).get()));
+  EXPECT_EQ(PyRef(ReturnsUnicodeOrNone{}.Make(std::nullopt)).get(), Py_None);
+  PyRef dictionary(ReturnsUnicodeDict{}.Make({{L"7", text}, {text, L""}}));
+  ASSERT_TRUE(dictionary && PyDict_CheckExact(dictionary.get()));
+  EXPECT_EQ(PyDict_Size(dictionary.get()), 2);
+  PyRef key(FromWide(L"7"));
+  EXPECT_TRUE(same(PyDict_GetItem(dictionary.get(), key.get())));
+}
+
 }  // namespace

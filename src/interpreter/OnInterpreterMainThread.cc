@@ -1,7 +1,7 @@
 #include <Python.h>
 #include <pythread.h>
 
-#include "upload/OnInterpreterMainThread.h"
+#include "interpreter/OnInterpreterMainThread.h"
 
 // Thread states are listed newest first, so the last one belongs to the thread
 // that initialised the interpreter: its main thread.

@@ -1,6 +1,6 @@
-// Lets an object's destruction wait for the operations that run on it while
-// the interpreter lock is released (another Python thread may drop the object
-// meanwhile), and keeps new ones from starting once destruction has begun.
+// Lets an object's destruction wait for the operations that run on it inside a
+// BlockingScope (another Python thread may drop the object meanwhile), and keeps
+// new ones from starting once destruction has begun.
 #pragma once
 
 #include <condition_variable>
@@ -34,9 +34,9 @@ class OperationGate {
   OperationGate(const OperationGate&) = delete;
   OperationGate& operator=(const OperationGate&) = delete;
 
-  // Refuses every later pass, then waits, with the interpreter lock released,
-  // until the passes of other threads have ended. Passes of the calling thread
-  // are not waited for: the destroyer may be running inside one of them.
+  // Refuses every later pass, then waits in a BlockingScope (the interpreter
+  // lock released) until the passes of other threads have ended. Passes of the
+  // calling thread are not waited for: the destroyer may be running inside one.
   void Close();
 
  private:

@@ -1,8 +1,8 @@
-#include "upload/OperationGate.h"
+#include "platform/operation_gate.h"
 
 #include <algorithm>
 
-#include "upload/AllowThreadsGuard.h"
+#include "platform/blocking_scope.h"
 
 OperationGate::Pass::Pass(OperationGate& gate) : state_(gate.state_), entered_(Enter(*state_)) {}
 
@@ -22,9 +22,10 @@ void OperationGate::Close() {
     state_->closed = true;
     if (!OthersInside()) return;
   }
-  // The passes waited for may need the interpreter lock to end. The gate's own
-  // lock is let go before the interpreter lock is taken back.
-  AllowThreadsGuard unlocked;
+  // The passes waited for may need what a blocking wait lets go of (the
+  // interpreter lock) to end. The gate's own lock is let go before that is
+  // taken back.
+  BlockingScope waiting;
   std::unique_lock<std::mutex> guard(state_->lock);
   state_->passEnded.wait(guard, [this] { return !OthersInside(); });
 }

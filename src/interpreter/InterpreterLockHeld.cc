@@ -1,6 +1,6 @@
 #include <Python.h>
 
-#include "upload/InterpreterLockHeld.h"
+#include "interpreter/InterpreterLockHeld.h"
 
 bool InterpreterLockHeld() {
   PyThreadState* mine = PyGILState_GetThisThreadState();

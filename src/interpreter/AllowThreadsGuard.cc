@@ -1,0 +1,13 @@
+#include <Python.h>
+
+#include "interpreter/AllowThreadsGuard.h"
+
+#include "interpreter/InterpreterLockHeld.h"
+
+void* AllowThreadsGuard::ReleaseInterpreterLock() {
+  return InterpreterLockHeld() ? PyEval_SaveThread() : nullptr;
+}
+
+void AllowThreadsGuard::RetakeInterpreterLock(void* released) {
+  if (released != nullptr) PyEval_RestoreThread(static_cast<PyThreadState*>(released));
+}
