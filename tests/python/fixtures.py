@@ -137,6 +137,19 @@ def threads_and_descriptors():
     return len(os.listdir('/proc/self/task')), len(os.listdir('/proc/self/fd'))
 
 
+def settled(measure, expected, timeout=1.0):
+    """measure() once it equals expected, or after timeout: a thread just joined
+    can still be listed for a moment while the kernel releases it."""
+    deadline = time.time() + timeout
+    while measure() != expected and time.time() < deadline:
+        time.sleep(0.005)
+    return measure()
+
+
+def thread_count():
+    return threads_and_descriptors()[0]
+
+
 class Ticker(object):
     """Counts in a Python thread, which only advances while the interpreter lock is free."""
 

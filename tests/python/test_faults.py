@@ -10,7 +10,7 @@ import unittest
 
 import _PyUploader as native
 from fixtures import (DETECTION_HOST, SERVER_HOST, STAGING_HOST, UPLOAD_PATH, UploadTest,
-                      raw, reply, threads_and_descriptors)
+                      raw, reply, settled, threads_and_descriptors)
 
 XML = ['Content-Type', 'text/xml; charset=UTF-8']
 NESTING = 100000
@@ -120,7 +120,7 @@ class FaultyReplies(UploadTest):
                 found = run(self)
                 if found != (failure if text is FAILED else carried(text)):
                     mismatches.append((name, fault, repr(found)[:200]))
-                if threads_and_descriptors() != held:
+                if settled(threads_and_descriptors, held) != held:
                     mismatches.append((name, fault, 'descriptors or threads left'))
         self.assertEqual(mismatches, [])
 

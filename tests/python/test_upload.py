@@ -13,7 +13,8 @@ import urllib
 from StringIO import StringIO
 
 from fixtures import (MAIN_THREAD, SERVER_HOST, SESSION, UPLOAD_PATH, Reports, UploadTest, pump,
-                      reply, run_python, threads_and_descriptors, wait_until, xml_reply)
+                      reply, run_python, settled, thread_count, threads_and_descriptors,
+                      wait_until, xml_reply)
 
 FIRST_URL = u'http://api.orbishare.com/template/view.jsp?id=5001'
 SECOND_URL = u'http://api.orbishare.com/template/view.jsp?id=5002'
@@ -247,7 +248,7 @@ class Stopping(UploadTest):
         self.assertEqual(threads_and_descriptors()[0], threads_before + 1)
         count = len(self.reports.items)
         self.uploader = None  # the last reference: the native object goes now
-        self.assertEqual(threads_and_descriptors()[0], threads_before)
+        self.assertEqual(settled(thread_count, threads_before), threads_before)
         pump(QUIET)
         self.assertEqual((len(self.reports.items), self.reports.completions()), (count, []))
         gc.collect()
@@ -284,7 +285,7 @@ class Stopping(UploadTest):
         self.reports.then = lambda reports, report: setattr(self, 'uploader', None)
         self.start()
         wait_until(lambda: self.reports.items, 30.0, 'first report')
-        self.assertEqual(threads_and_descriptors()[0], threads_before)
+        self.assertEqual(settled(thread_count, threads_before), threads_before)
         pump(QUIET)
         self.assertEqual(len(self.reports.items), 1)
 
