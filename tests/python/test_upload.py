@@ -224,7 +224,7 @@ class Stopping(UploadTest):
         # reference cycle (never collected: its worker still runs when the process ends).
         for in_cycle in (False, True):
             self.svc.reset()
-            self.slow_reader(1024 * 1024)
+            self.slow_reader(8 * 1024 * 1024)  # what the socket buffers hold drains soon
             started = time.time()
             code, out, err = run_python('''
                 from fixtures import Reports, SESSION, TEXTS, wait_until
