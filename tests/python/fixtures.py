@@ -126,9 +126,7 @@ def wait_until(condition, timeout=10.0, what='the condition'):
 
 def pump(seconds):
     """Lets the main thread take the reports that arrive for a while."""
-    deadline = time.time() + seconds
-    while time.time() < deadline:
-        time.sleep(0.02)
+    settled(lambda: None, True, seconds)
 
 
 def run_python(code, *args, **timeout):
@@ -157,23 +155,21 @@ def settled(measure, expected, timeout=1.0):
     return measure()
 
 
-class Ticker(object):
+class Ticker(threading.Thread):
     """Counts in a Python thread, which only advances while the interpreter lock is free."""
 
     def __enter__(self):
-        self.ticks, self._stop = 0, threading.Event()
-        self._thread = threading.Thread(target=self._run)
-        self._thread.start()
+        self.ticks, self.stop = 0, threading.Event()
+        self.start()
         return self
 
     def __exit__(self, *exc):
-        self._stop.set()
-        self._thread.join()
+        self.stop.set()
+        self.join()
 
-    def _run(self):
-        while not self._stop.is_set():
+    def run(self):
+        while not self.stop.wait(0.01):
             self.ticks += 1
-            time.sleep(0.01)
 
 
 # A pointer object holds, after the object header, the address, the type and the ownership flag.

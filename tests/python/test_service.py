@@ -81,11 +81,6 @@ class Discovery(SessionTest):
             self.assertEqual(self.trace(), lines)
             self.assertEqual(self.call('GetSignUpURL'), links(STAGING_HOST, link)[0])
 
-    def test_an_empty_field_empties_its_link_and_an_absent_one_keeps_the_default(self):
-        self.discover(xml_reply(info_xml(APIUrl=SERVER_HOST, SignUp=''), status=500))
-        self.assertEqual([self.call(g) for g in GETTERS[1:3]],
-                         links(SERVER_HOST, '', 'http://%s/forgetpwd' % DEFAULT_HOST))
-
     def test_any_framing_is_read_whole_up_to_16_mib_and_cut_at_the_announced_length(self):
         # Cut anywhere, the document would not be well-formed and would yield nothing.
         document = '<INFO><P>%s</P><APIUrl>%s</APIUrl></INFO>' % ('p' * 200000, SERVER_HOST)
@@ -99,7 +94,9 @@ class Discovery(SessionTest):
 
     def test_a_404_is_reachable_a_refusing_host_falls_back_at_once_and_a_long_url_is_not_probed(self):
         self.svc.script(DETECTION_HOST, '/', [reply('missing', 404)])
-        self.assertEqual(self.discover(), SERVER)
+        # Even with an error status, an empty field empties its link and an absent one keeps the default.
+        self.assertEqual(self.discover(xml_reply(info_xml(APIUrl=SERVER_HOST, SignUp=''), status=500)), SERVER)
+        self.assertEqual([self.call(g) for g in GETTERS[1:3]], links(SERVER_HOST, '', 'http://%s/forgetpwd' % DEFAULT_HOST))
         self.assertEqual((self.call('m_bServerReachable_get'), self.call('m_szChkServerUrl_get')),
                          (1, 'http://' + DETECTION_HOST))
         self.svc.reset()
