@@ -1,7 +1,7 @@
 """Objects that go away while they are still at work: an uploader dropped on another
 Python thread while the main thread handles its reports, a session deleted while it
 signs in, a callable that lets go of itself during its call, a class registered again."""
-# ctest timeout: 150
+# ctest timeout: 75
 import sys
 import threading
 import time
@@ -100,7 +100,7 @@ class WhileAtWork(Test):
 
     def test_drops_in_the_join_the_reports_and_the_callables_neither_hang_nor_crash(self):
         self.svc.host_state(REFUSING_HOST, 'down')
-        code, out, err = run_python(DROPS, str(DROP_ROUNDS), SERVER_HOST, REFUSING_HOST, timeout=100)
+        code, out, err = run_python(DROPS, str(DROP_ROUNDS), SERVER_HOST, REFUSING_HOST, timeout=45)
         self.assertEqual((code, out.count('\n')), (0, DROP_ROUNDS), err)
 
     def test_deleting_a_session_waits_for_the_operation_running_on_another_thread(self):

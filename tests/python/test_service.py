@@ -2,7 +2,7 @@
 sign-in over TLS and sign-out, categories, related video, effect lookup and the links;
 what is sent, what each reply leaves, the trace, the interpreter lock, and the
 references of what the module builds."""
-# ctest timeout: 45
+# ctest timeout: 60
 import os
 import sys
 import threading
