@@ -80,8 +80,7 @@ for number in range(ROUNDS):
     deadline = time.time() + ROUND_LIMIT
     while dropper.is_alive():  # Python code runs here, so reports are handled
         assert time.time() < deadline, 'the drop did not end'
-    heard = len(reports.items)
-    settle = time.time() + 0.005
+    heard, settle = len(reports.items), time.time() + 0.005
     while time.time() < settle:
         pass
     assert len(reports.items) == heard, 'a report after the drop'
