@@ -63,22 +63,18 @@ class Files(Test):
         self.assertEqual((code, out.splitlines()), (0, ['MemoryError, copies freed', 'alive']), err)
 
     def test_only_a_regular_hive_file_of_at_most_1_mib_is_read(self):
-        hive = os.path.join(self.folder, 'other.reg')
         padding = lambda size: (b'; ' + b'x' * 78 + b'\r\n') * (size // 82)
-        outcomes = []
-        rows = [('under 1 MiB', padding((1 << 20) - 1000), True), ('2 MiB', padding(2 << 20), False),
-                ('FIFO', None, False), ('/dev/zero', '/dev/zero', False)]
-        for name, content, traced in rows:
+        outcomes, rows = [], [('under 1 MiB', padding((1 << 20) - 1000), True), ('2 MiB', padding(2 << 20), False),
+                              ('FIFO', None, False), ('/dev/zero', '/dev/zero', False)]
+        for number, (name, content, traced) in enumerate(rows):
             self.clear_trace()
-            if os.path.exists(hive):
-                os.remove(hive)
+            hive = content if content == '/dev/zero' else os.path.join(self.folder, '%d.reg' % number)
             if content is None:
                 os.mkfifo(hive)
-            elif content != '/dev/zero':
+            elif hive != content:
                 with open(hive, 'wb') as out:
                     out.write(self.HIVE + content)
-            os.environ['PYUPLOADER_REGISTRY'] = content if content == '/dev/zero' else hive
-            began = time.time()
+            os.environ['PYUPLOADER_REGISTRY'], began = hive, time.time()
             code, _, err = run_python("""
                 import _PyUploader as native
                 native.delete_OBLoginData(native.new_OBLoginData(u'5.0', u'Retail', u'm'))""", timeout=10)
