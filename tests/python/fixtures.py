@@ -1,13 +1,12 @@
 """Fixtures of the Python suites, run inside tests/sandbox/run: the reference service's
-control interface, the trace, pointer objects' layout, a session or an upload per test.
-Replies (reply()) may also set: delay (seconds), pieces and pause, chunked,
-no_length, close_after (bytes, then close), hang, read_rate (request bytes per
-second), abort_after (body bytes, then drop) and raw_b64 (instead of a reply).
+control interface, the trace, a session or an upload per test.
+Replies (reply()) may also set: delay (seconds), pieces and pause, chunked, no_length,
+close_after, hang, read_rate (request bytes per second), drip (reply bytes per second),
+abort_after (body bytes, then drop) and raw_b64 (instead of a reply).
 Host states: 'up', 'down', 'hang'. Certificates: 'good', 'expired', 'wrong-name'.
 """
 import base64
 import ctypes
-import imp
 import json
 import os
 import shutil
@@ -15,29 +14,40 @@ import subprocess
 import sys
 import tempfile
 import textwrap
-import thread
 import threading
 import time
 import unittest
-import urllib2
+try:
+    from urllib.request import Request, urlopen, quote
+    from urllib.error import HTTPError
+except ImportError:
+    from urllib2 import Request, urlopen, quote, HTTPError
 
 import _PyUploader as native
 from PyUploader import PyPresetUploader
 
-_HOSTS = imp.load_source('_hosts', os.path.join(os.path.dirname(__file__), '..', 'service', 'hosts.py'))
-DEFAULT_HOST, STAGING_HOST = _HOSTS.DEFAULT_HOST, _HOSTS.STAGING_HOST
-DETECTION_HOST, SERVER_HOST = _HOSTS.DETECTION_HOST, _HOSTS.SERVER_HOST
-MAIN_THREAD = thread.get_ident()
+text_type = type(u'')  # what the module returns for a text
+PY2 = sys.version_info[0] == 2
+_HOSTS = {'__name__': 'hosts'}
+exec(compile(open(os.path.join(os.path.dirname(__file__), '..', 'service', 'hosts.py')).read(),
+             'hosts.py', 'exec'), _HOSTS)
+DEFAULT_HOST, STAGING_HOST = _HOSTS['DEFAULT_HOST'], _HOSTS['STAGING_HOST']
+DETECTION_HOST, SERVER_HOST = _HOSTS['DETECTION_HOST'], _HOSTS['SERVER_HOST']
+HTTP_PORT, TLS_PORT = _HOSTS['HTTP_PORT'], _HOSTS['TLS_PORT']
+MAIN_THREAD = threading.current_thread().ident
 UUID = u'machine-1'
 UPLOAD_PATH = '/servlet/uploadTemplate'
-HTTP_PORT, TLS_PORT = _HOSTS.HTTP_PORT, _HOSTS.TLS_PORT
+
+
+def b64(data):
+    return base64.b64encode(data).decode('ascii')
 
 
 def reply(body=None, status=None, headers=None, **options):
-    """A scripted reply; body is sent byte for byte (unicode as UTF-8)."""
+    """A scripted reply; body is sent byte for byte (text as UTF-8)."""
     if body is not None:
-        body = body.encode('utf-8') if isinstance(body, unicode) else body
-        options.update(body_b64=base64.b64encode(body), status=200)
+        body = body.encode('utf-8') if isinstance(body, text_type) else body
+        options.update(body_b64=b64(body), status=200)
     options.update((k, v) for k, v in (('status', status), ('headers', headers)) if v is not None)
     return options
 
@@ -47,12 +57,12 @@ def xml_reply(xml, status=200, **options):
 
 
 def raw(data):
-    return reply(raw_b64=base64.b64encode(data))
+    return reply(raw_b64=b64(data))
 
 
 def _decode(value):
     if isinstance(value, dict):
-        if value.keys() == ['base64']:
+        if list(value) == ['base64']:
             return base64.b64decode(value['base64'])
         return dict((k, _decode(v)) for k, v in value.items())
     return [_decode(v) for v in value] if isinstance(value, list) else value
@@ -76,7 +86,7 @@ class Recorded(object):
 
 
 class RefService(object):
-    url = os.environ.get('REFSERVICE_CONTROL', _HOSTS.CONTROL_URL)
+    url = os.environ.get('REFSERVICE_CONTROL', _HOSTS['CONTROL_URL'])
 
     def reset(self):
         self._call('/reset', {})
@@ -92,15 +102,15 @@ class RefService(object):
 
     def requests(self, host=None, path=None, bodies=True):
         query = [(k, v) for k, v in (('bodies', None if bodies else '0'), ('host', host), ('path', path)) if v]
-        query = '&'.join('%s=%s' % (k, urllib2.quote(v, safe='')) for k, v in query)
+        query = '&'.join('%s=%s' % (k, quote(v, safe='')) for k, v in query)
         return [Recorded(r) for r in self._call('/requests?' + query)['requests']]
 
     def _call(self, path, body=None):
-        data = json.dumps(body) if body is not None else None
-        request = urllib2.Request(self.url + path, data, {'Content-Type': 'application/json'})
+        data = json.dumps(body).encode('utf-8') if body is not None else None
+        request = Request(self.url + path, data, {'Content-Type': 'application/json'})
         try:
-            return json.loads(urllib2.urlopen(request, timeout=30).read())
-        except urllib2.HTTPError as error:
+            return json.loads(urlopen(request, timeout=30).read().decode('utf-8'))
+        except HTTPError as error:
             raise AssertionError('control %s: %s' % (path, error.read()))
 
 
@@ -116,24 +126,23 @@ def wait_until(condition, timeout=10.0, what='the condition'):
 
 def pump(seconds):
     """Lets the main thread take the reports that arrive for a while."""
-    deadline = time.time() + seconds
-    while time.time() < deadline:
-        time.sleep(0.02)
+    settled(lambda: None, True, seconds)
 
 
 def run_python(code, *args, **timeout):
-    """Runs code in a fresh interpreter; returns (exit code, stdout, stderr). One still
-    running after timeout seconds (60) is killed."""
+    """Runs code in a fresh interpreter; returns (exit code, stdout, stderr) as text. One
+    still running after timeout seconds (60) is killed."""
     proc = subprocess.Popen([sys.executable, '-c', textwrap.dedent(code)] + list(args),
                             stdout=subprocess.PIPE, stderr=subprocess.PIPE)
     killer = threading.Timer(timeout.get('timeout', 60), proc.kill)
     killer.start()
     out, err = proc.communicate()
     killer.cancel()
-    return proc.returncode, out, err
+    return proc.returncode, out.decode('utf-8'), err.decode('utf-8', 'replace')
 
 
-def threads_and_descriptors():
+def counts():
+    """(threads, descriptors) of this process."""
     return len(os.listdir('/proc/self/task')), len(os.listdir('/proc/self/fd'))
 
 
@@ -146,40 +155,25 @@ def settled(measure, expected, timeout=1.0):
     return measure()
 
 
-def thread_count():
-    return threads_and_descriptors()[0]
-
-
-class Ticker(object):
+class Ticker(threading.Thread):
     """Counts in a Python thread, which only advances while the interpreter lock is free."""
 
     def __enter__(self):
-        self.ticks, self._stop = 0, threading.Event()
-        self._thread = threading.Thread(target=self._run)
-        self._thread.start()
+        self.ticks, self.stop = 0, threading.Event()
+        self.start()
         return self
 
     def __exit__(self, *exc):
-        self._stop.set()
-        self._thread.join()
+        self.stop.set()
+        self.join()
 
-    def _run(self):
-        while not self._stop.is_set():
+    def run(self):
+        while not self.stop.wait(0.01):
             self.ticks += 1
-            time.sleep(0.01)
 
 
 # A pointer object holds, after the object header, the address, the type and the ownership flag.
 _PTR = 2 * ctypes.sizeof(ctypes.c_void_p)
-
-
-def address_of(pointer_object):
-    return ctypes.c_void_p.from_address(id(pointer_object) + _PTR).value or 0
-
-
-def cell(pointer_object):
-    """The pointer-sized cell that a pointer object points at (a handle)."""
-    return ctypes.c_void_p.from_address(address_of(pointer_object))
 
 
 class Relocated(object):
@@ -195,10 +189,15 @@ class Relocated(object):
         self.cell.value = self.saved
 
 
+def cell(pointer_object):
+    """The pointer-sized cell that a pointer object points at (a handle)."""
+    return ctypes.c_void_p.from_address(ctypes.c_void_p.from_address(id(pointer_object) + _PTR).value)
+
+
 class Test(unittest.TestCase):
     """A reset service, and the trace on in a temporary hive and output file."""
-    HIVE = ('Windows Registry Editor Version 5.00\r\n\r\n[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\'
-            'Lumivanta]\r\n"DumpMsg"=dword:00000001\r\n')
+    HIVE = (b'Windows Registry Editor Version 5.00\r\n\r\n[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\'
+            b'Lumivanta]\r\n"DumpMsg"=dword:00000001\r\n')
 
     def setUp(self):
         self.svc = RefService()
@@ -233,7 +232,7 @@ class SessionTest(Test):
     def setUp(self):
         Test.setUp(self)
         self.browser = os.path.join(self.folder, 'browser')
-        with open(self.browser, 'wb') as out:
+        with open(self.browser, 'w') as out:
             out.write('#!/bin/sh\nprintf "%s\\n" "$1" >> "$0.links"\n')
         os.chmod(self.browser, 0o700)
         os.environ['BROWSER'] = self.browser
@@ -249,18 +248,8 @@ class SessionTest(Test):
     def call(self, operation, *args):
         return getattr(native, 'OBLoginData_' + operation)(self.session, *args)
 
-    def sign_in(self):
-        self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
-        self.svc.reset()  # later assertions see only the operation's requests
-        self.clear_trace()
-
     def sent(self, path, host=SERVER_HOST):
         return self.svc.requests(host=host, path=path)
-
-    def opened_links(self):
-        wait_until(lambda: os.path.exists(self.browser + '.links'), 10.0, 'opened link')
-        with open(self.browser + '.links') as opened:
-            return opened.read().splitlines()
 
 
 SESSION = (u'api.orbishare.com', u'0123456789abcdef01234567', u'5.0', u'Retail', u'uuid-1')
@@ -275,7 +264,7 @@ class Reports(object):
 
     def __call__(self, *report):
         self.items.append(report)
-        self.threads.add(thread.get_ident())
+        self.threads.add(threading.current_thread().ident)
         if self.then:
             self.then(self, report)
 
@@ -296,8 +285,8 @@ class UploadTest(Test):
         self.uploader = self.new_uploader()
         self.addCleanup(lambda: setattr(self, 'uploader', None))
 
-    def replace_files(self, preset_size=3000, image_sizes=None, prefix=u'preset-\xe9-'):
-        folder = tempfile.mkdtemp(prefix=prefix, dir=self.folder)
+    def replace_files(self, preset_size=3000, image_sizes=None):
+        folder = tempfile.mkdtemp(prefix=u'preset-\xe9-', dir=self.folder)
         self.images = []
         for i, size in enumerate([preset_size] + (image_sizes or [1000 + 77 * i for i in range(12)])):
             path = os.path.join(folder, u'Golden hour.preset' if i == 0 else u'preview_%02d.png' % i)
@@ -306,11 +295,6 @@ class UploadTest(Test):
             self.images.append(path)
         self.preset = self.images.pop(0)
         self.missing = os.path.join(folder, u'missing.png')
-
-    def parts(self):
-        """(field name, path) of the fourteen file parts, in wire order."""
-        return zip(['PIPfile', 'PIPimg'] + ['PIPimg_%d' % (i + 1) for i in range(12)],
-                   [self.preset, self.images[0]] + self.images)
 
     def new_uploader(self, *session):
         uploader = PyPresetUploader(*(session or SESSION))

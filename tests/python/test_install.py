@@ -1,6 +1,6 @@
-"""`cmake --install` of the build: the module and its companion land in the
-interpreter's own site-packages, or in the same layout below a given prefix,
-and import from there with no PYTHONPATH; help() documents every method."""
+"""`cmake --install` of the build: the module and its companion land in the interpreter's
+own site-packages, or in the same layout below a given prefix, and import from there
+with no PYTHONPATH; help() documents every method."""
 import os
 import shutil
 import subprocess
@@ -10,47 +10,34 @@ import tempfile
 import unittest
 
 BUILD = os.environ['UPLOADER_BUILD_DIR']
-INSTALLED = ['_PyUploader.so', 'PyUploader.py']
-# Imports the companion from the user site (PYTHONUSERBASE) and names what has
-# no docstring.
+# Imports the companion from the user site (PYTHONUSERBASE) and names what has no docstring.
 IMPORT_AND_DOCUMENT = """
 import inspect, PyUploader, _PyUploader
-print PyUploader.__file__
-print _PyUploader.__file__
+print(PyUploader.__file__)
+print(_PyUploader.__file__)
 for name, cls in inspect.getmembers(PyUploader, inspect.isclass):
-    for label, thing in [(name, cls)] + inspect.getmembers(cls, inspect.ismethod):
+    for label, thing in [(name, cls)] + inspect.getmembers(cls, lambda m: inspect.isfunction(m) or inspect.ismethod(m)):
         if not (thing.__doc__ or '').strip():
-            print 'undocumented', name, label
+            print('undocumented %s %s' % (name, label))
 """
 
 
 class Install(unittest.TestCase):
 
-    def setUp(self):
-        self.root = tempfile.mkdtemp(prefix='install-')
-        self.addCleanup(shutil.rmtree, self.root, True)
-
-    def install(self, *options, **env):
-        subprocess.check_output(['cmake', '--install', BUILD] + list(options),
-                                env=dict(os.environ, **env), stderr=subprocess.STDOUT)
-
-    def assert_installed(self, folder):
-        self.assertEqual(sorted(os.listdir(folder)), sorted(INSTALLED))
-
-    def test_by_default_into_the_interpreters_site_packages(self):
-        self.install(DESTDIR=self.root)
-        self.assert_installed(self.root + sysconfig.get_paths()['platlib'])
-
-    def test_below_a_prefix_in_the_interpreters_layout_and_importable(self):
-        self.install('--prefix', self.root)
-        site = sysconfig.get_paths(vars={'base': self.root, 'platbase': self.root})['platlib']
-        self.assert_installed(site)
-        env = dict(os.environ, PYTHONUSERBASE=self.root)
+    def test_into_the_interpreters_site_packages_or_below_a_prefix_and_importable(self):
+        root = tempfile.mkdtemp(prefix='install-')
+        self.addCleanup(shutil.rmtree, root, True)
+        for options, env, site in [
+                ([], dict(DESTDIR=root + '/destdir'), root + '/destdir' + sysconfig.get_paths()['platlib']),
+                (['--prefix', root], {}, sysconfig.get_paths(vars={'base': root, 'platbase': root})['platlib'])]:
+            subprocess.check_output(['cmake', '--install', BUILD] + options, env=dict(os.environ, **env),
+                                    stderr=subprocess.STDOUT)
+            self.assertEqual(sorted(os.listdir(site)), ['PyUploader.py', '_PyUploader.so'])
+        env = dict(os.environ, PYTHONUSERBASE=root)
         env.pop('PYTHONPATH')
-        output = subprocess.check_output([sys.executable, '-c', IMPORT_AND_DOCUMENT], env=env,
-                                         cwd=self.root, stderr=subprocess.STDOUT)
-        self.assertEqual(output.splitlines(),
-                         [os.path.join(site, 'PyUploader.py'), os.path.join(site, '_PyUploader.so')])
+        output = subprocess.check_output([sys.executable, '-c', IMPORT_AND_DOCUMENT], env=env, cwd=root,
+                                         stderr=subprocess.STDOUT).decode('utf-8')
+        self.assertEqual(output.splitlines(), [os.path.join(site, 'PyUploader.py'), os.path.join(site, '_PyUploader.so')])
 
 
 if __name__ == '__main__':

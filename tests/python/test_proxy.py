@@ -1,7 +1,6 @@
-"""A real HTTP proxy (tinyproxy, started inside the sandbox): with http_proxy and
-https_proxy set, discovery, categories and the upload go through it, sign-in
-tunnels through CONNECT with the certificate still verified, and no_proxy
-bypasses it. The proxy's log and the Via header it adds show what went through."""
+"""A real HTTP proxy (tinyproxy, in the sandbox): with http_proxy and https_proxy set,
+discovery, categories and the upload go through it, sign-in tunnels through CONNECT
+with the certificate still verified, and no_proxy bypasses it."""
 import os
 import re
 import shutil
@@ -11,7 +10,7 @@ import tempfile
 import unittest
 
 import _PyUploader as native
-from fixtures import DETECTION_HOST, SERVER_HOST, UPLOAD_PATH, UploadTest, wait_until
+from fixtures import DEFAULT_HOST, DETECTION_HOST, SERVER_HOST, UPLOAD_PATH, UploadTest, text_type, wait_until
 
 PROXY_PORT = 8888
 PROXY_URL = 'http://127.0.0.1:%d' % PROXY_PORT
@@ -40,14 +39,13 @@ def proxy_accepts():
         return False
 
 
-class ProxyTest(UploadTest):
+class ThroughTheProxy(UploadTest):
 
     @classmethod
     def setUpClass(cls):
         cls.folder = tempfile.mkdtemp(prefix='proxy-')
         os.chmod(cls.folder, 0o777)  # the proxy writes its log as nobody
-        cls.log = os.path.join(cls.folder, 'proxy.log')
-        config = os.path.join(cls.folder, 'tinyproxy.conf')
+        cls.log, config = os.path.join(cls.folder, 'proxy.log'), os.path.join(cls.folder, 'tinyproxy.conf')
         with open(config, 'w') as out:
             out.write(CONFIG % (PROXY_PORT, cls.log, VIA_NAME))
         cls.proxy = subprocess.Popen(['tinyproxy', '-d', '-c', config],
@@ -71,48 +69,34 @@ class ProxyTest(UploadTest):
         return getattr(native, 'OBLoginData_' + operation)(self.session, *args)
 
     def proxied(self):
-        """(method, target) of every request the proxy logged, in order."""
+        """(method, target) of every request the proxy logged since the test began."""
         with open(self.log) as log:
-            return LOGGED_REQUEST.findall(log.read())
-
-    def proxied_now(self):
-        return self.proxied()[self.logged_before:]
+            return LOGGED_REQUEST.findall(log.read())[getattr(self, 'logged_before', 0):]
 
     def via(self, host, path):
         return [request.header('Via') for request in self.svc.requests(host=host, path=path)]
 
-
-class ThroughTheProxy(ProxyTest):
-
-    def test_discovery_categories_and_the_upload_go_through_it(self):
+    def test_discovery_categories_and_the_upload_go_through_it_and_sign_in_tunnels_verified(self):
         self.call('InitOBServerURL')
-        self.assertEqual(self.call('GetServerUrl'), unicode(SERVER_HOST))
+        self.assertEqual(self.call('GetServerUrl'), text_type(SERVER_HOST))
         self.call('GetPresetCategory', u'ENU')
         self.assertEqual(self.start(), 1)
         self.assertEqual(self.completion()[3], 1)
-        methods = [(method, target.split('?')[0]) for method, target in self.proxied_now()]
-        self.assertEqual(methods, [
-            ('GET', 'http://%s/' % DETECTION_HOST),
-            ('GET', 'http://%s/observer.jsp' % DETECTION_HOST),
-            ('POST', 'http://%s%s' % (SERVER_HOST, CATEGORIES)),
-            ('POST', 'http://%s%s' % (SERVER_HOST, UPLOAD_PATH))])
-        [upload] = self.uploads()
-        self.assertEqual(upload.complete, True)
-        for host, path in ((DETECTION_HOST, '/observer.jsp'), (SERVER_HOST, CATEGORIES),
-                           (SERVER_HOST, UPLOAD_PATH)):
+        self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
+        self.assertEqual([(method, target.split('?')[0]) for method, target in self.proxied()], [
+            ('GET', 'http://%s/' % DETECTION_HOST), ('GET', 'http://%s/observer.jsp' % DETECTION_HOST),
+            ('POST', 'http://%s%s' % (SERVER_HOST, CATEGORIES)), ('POST', 'http://%s%s' % (SERVER_HOST, UPLOAD_PATH)),
+            ('GET', 'http://%s/' % DEFAULT_HOST), ('CONNECT', '%s:443' % SERVER_HOST)])
+        self.assertEqual(self.uploads()[0].complete, True)
+        for host, path in ((DETECTION_HOST, '/observer.jsp'), (SERVER_HOST, CATEGORIES), (SERVER_HOST, UPLOAD_PATH)):
             [via] = self.via(host, path)
             self.assertTrue(via.startswith('1.1 ' + VIA_NAME), (path, via))
-
-    def test_sign_in_tunnels_and_a_wrong_certificate_is_still_refused(self):
-        self.call('SetOBURLAsReg', unicode(SERVER_HOST))
-        self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
-        self.assertIn(('CONNECT', '%s:443' % SERVER_HOST), self.proxied_now())
         [sign_in] = self.svc.requests(host=SERVER_HOST, path=SIGN_IN)
-        self.assertEqual((sign_in.tls, sign_in.header('Via')), (True, None))  # opaque tunnel
+        self.assertEqual((sign_in.tls, sign_in.header('Via')), (True, None))  # an opaque tunnel
         self.svc.reset()
         self.svc.tls('wrong-name')
         self.call('LogoutOrbishare')
-        self.call('SetOBURLAsReg', unicode(SERVER_HOST))
+        self.call('SetOBURLAsReg', text_type(SERVER_HOST))
         self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 0)
         self.assertEqual(self.svc.requests(host=SERVER_HOST, path=SIGN_IN), [])
 
@@ -121,8 +105,7 @@ class ThroughTheProxy(ProxyTest):
         self.call('InitOBServerURL')
         self.call('GetPresetCategory', u'ENU')
         self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
-        self.assertEqual(self.proxied_now(), [])
-        self.assertEqual(self.via(SERVER_HOST, CATEGORIES), [None])
+        self.assertEqual((self.proxied(), self.via(SERVER_HOST, CATEGORIES)), ([], [None]))
 
 
 if __name__ == '__main__':
