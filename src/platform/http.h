@@ -77,8 +77,6 @@ class Request {
 
   // 0 until a final reply head has arrived.
   std::uint32_t status_code() const;
-  // The first header of that name (any case), trimmed; empty when absent.
-  std::string HeaderValue(std::string_view name) const;
   // What has been read of the reply body.
   const std::string& body() const;
   // The reply body moved out, so that a large one is not copied; body() is

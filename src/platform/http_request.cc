@@ -1,7 +1,7 @@
 #include <algorithm>
-#include <cctype>
 #include <string>
 
+#include "platform/ascii.h"
 #include "platform/http.h"
 #include "platform/http_body_feeder.h"
 #include "platform/http_driver.h"
@@ -29,13 +29,7 @@ long UploadBufferSize(std::uint64_t content_length) {
 }
 
 bool IsContentType(std::string_view line) {
-  constexpr std::string_view kName = "content-type";
-  const std::string_view name = NameOf(line);
-  if (name.size() != kName.size()) return false;
-  for (std::size_t i = 0; i < name.size(); ++i) {
-    if (std::tolower(static_cast<unsigned char>(name[i])) != kName[i]) return false;
-  }
-  return true;
+  return ascii::EqualIgnoringCase(NameOf(line), "content-type");
 }
 
 }  // namespace
@@ -190,10 +184,6 @@ win::Status Request::Send(std::string_view body) {
 }
 
 std::uint32_t Request::status_code() const { return state_->reader().status_code(); }
-
-std::string Request::HeaderValue(std::string_view name) const {
-  return state_->reader().HeaderValue(name);
-}
 
 const std::string& Request::body() const { return state_->reader().body(); }
 

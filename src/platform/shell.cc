@@ -5,12 +5,12 @@
 #include <sys/types.h>
 #include <sys/wait.h>
 
-#include <cctype>
 #include <cstdlib>
 #include <string>
 #include <thread>
 #include <vector>
 
+#include "platform/ascii.h"
 #include "platform/text.h"
 
 extern char** environ;
@@ -26,12 +26,7 @@ bool IsWebLink(std::string_view link) {
     if (static_cast<unsigned char>(c) < 0x20 || c == 0x7F) return false;
   }
   for (std::string_view scheme : kSchemes) {
-    if (link.size() <= scheme.size()) continue;
-    bool same = true;
-    for (size_t i = 0; i < scheme.size() && same; ++i) {
-      same = std::tolower(static_cast<unsigned char>(link[i])) == scheme[i];
-    }
-    if (same) return true;
+    if (link.size() > scheme.size() && ascii::StartsWithIgnoringCase(link, scheme)) return true;
   }
   return false;
 }

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 
+#include "platform/ascii.h"
 #include "platform/text.h"
 
 namespace xml {
@@ -145,13 +146,13 @@ std::vector<Node> Node::Children() const {
 Document::Document() : document_(std::make_unique<pugi::xml_document>()) {}
 
 Document::Document(std::wstring_view text)
-    : Document(text::WideToUtf8(text.substr(0, text.find(L'\0')))) {}
+    : Document(text::WideToUtf8(ascii::UpToNul(text))) {}
 
 Document::Document(std::string utf8)
     : text_(std::make_unique<std::string>(std::move(utf8))),
       document_(std::make_unique<pugi::xml_document>()) {
   std::string& text = *text_;
-  text.resize(std::min(text.size(), text.find('\0')));  // the reply text ends at its terminator
+  text.resize(ascii::UpToNul(text).size());  // the reply text ends at its terminator
   if (MostTreeBytes(text) > kMaxTreeBytes) return;
   const pugi::xml_parse_result result = document_->load_buffer_inplace(
       text.data(), text.size(), kParseOptions, pugi::encoding_utf8);

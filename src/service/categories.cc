@@ -46,7 +46,7 @@ const OBLoginData::Categories& OBLoginData::GetPresetCategory(const wchar_t* lan
   const std::wstring path =
       QueryPath(kCategoryServlet, {{L"Locid", text::WideView(language)}, {L"Version", m_strVersion}});
   // A failed exchange adds nothing: the categories of earlier calls are returned.
-  if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
+  if (auto reply = PostToServer(m_strServerUrl, path, ReplyCoding::kUtf8)) {
     AddCategories(xml::Document(std::move(*reply)), m_mapCategory);
   }
   return m_mapCategory;

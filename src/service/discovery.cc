@@ -73,7 +73,6 @@ void OBLoginData::DetectServerInfo() {
   if (!m_strVersionType.empty()) {
     request.path += L"&versionType=" + service::EscapePathValue(m_strVersionType);
   }
-  request.read = service::ReplyRead::kByLength;
   std::optional<std::string> reply = service::RunExchange(request);
   if (reply) StoreServiceInfo(xml::Document(service::DecodeAnsiReply(std::move(*reply))));
 }

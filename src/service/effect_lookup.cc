@@ -33,7 +33,7 @@ std::optional<std::wstring> OBLoginData::GetEffectByGUID(const wchar_t* guid) {
   EnsureServerUrl();
   const std::wstring path = QueryPath(kEffectServlet, {{L"token", token}, {L"guid", guid}});
   std::wstring address;
-  if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
+  if (auto reply = PostToServer(m_strServerUrl, path, ReplyCoding::kUtf8)) {
     address = EffectAddress(xml::Document(std::move(*reply)));
   }
   return UnescapeUrl(address);

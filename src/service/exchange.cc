@@ -1,8 +1,8 @@
 #include "service/exchange.h"
 
-#include <algorithm>
 #include <utility>
 
+#include "platform/ascii.h"
 #include "platform/http.h"
 #include "platform/text.h"
 #include "service/percent_encoding.h"
@@ -27,11 +27,6 @@ bool SendRequest(http::Request& request, const ServiceRequest& what) {
   return !win::Failed(request.Send(what.body));
 }
 
-// The service's three readings differ only in how much of a body that WinInet
-// had not yet received they would see. libcurl hands over the body framed by its
-// announced length, its chunks or the connection's end, so each takes it whole.
-std::string ReadReply(http::Request& request, ReplyRead) { return request.TakeBody(); }
-
 bool MayNotStandInTarget(unsigned char byte) {
   return byte < kFirstPrintable || byte >= kDelete || byte == kFragmentMark;
 }
@@ -44,18 +39,21 @@ std::optional<std::string> RunExchange(const ServiceRequest& what) {
                                     PortOf(what.transport), SchemeOf(what.transport));
   http::Request request(connection, what.verb, text::WideToUtf8(what.path));
   if (!SendRequest(request, what)) return std::nullopt;
-  return ReadReply(request, what.read);
+  return request.TakeBody();
 }
 
 std::string DecodeUtf8Reply(std::string bytes) {
-  bytes.resize(std::min(bytes.size(), bytes.find('\0')));
+  bytes.resize(ascii::UpToNul(bytes).size());
   return text::ValidUtf8(std::move(bytes));
 }
 
-std::string DecodeAnsiReply(std::string bytes) { return DecodeUtf8Reply(std::move(bytes)); }
+std::string DecodeAnsiReply(std::string bytes) {
+  bytes.resize(ascii::UpToNul(bytes).size());
+  return text::AnsiToUtf8(std::move(bytes));
+}
 
 std::wstring EscapePathValue(std::wstring_view value) {
-  return PercentEncode(text::WideToUtf8(value), MayNotStandInTarget, kUpperHexDigits);
+  return PercentEncode(text::WideToUtf8(value), MayNotStandInTarget, ascii::kUpperHexDigits);
 }
 
 }  // namespace service

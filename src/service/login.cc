@@ -62,7 +62,6 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
   request.headers = kSignInHeaders;
   request.body = SignInBody(EscapeFormValue(account), EscapeFormValue(password), m_strVersion,
                             m_strVersionType, m_strUuid);
-  request.read = service::ReplyRead::kByLength;
   std::optional<std::string> reply = service::RunExchange(request);
   if (!reply) return 0;
 

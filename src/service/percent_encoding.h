@@ -5,8 +5,7 @@
 #include <string>
 #include <string_view>
 
-inline constexpr char kUpperHexDigits[] = "0123456789ABCDEF";
-inline constexpr char kLowerHexDigits[] = "0123456789abcdef";
+#include "platform/ascii.h"
 
 // The bytes as wide text, each byte for which `mustEscape` holds written as "%"
 // and two hex digits taken from `digits`.

@@ -56,7 +56,7 @@ std::optional<std::wstring> OBLoginData::SetRelateVideo(const wchar_t* videoURL,
                                                             {L"versionType", m_strVersionType},
                                                             {L"uuid", m_strUuid}}) +
                             L'&' + service::EscapePathValue(videoInfo);
-  return ReplyField(PostToServer(m_strServerUrl, path, service::ReplyRead::kToEnd, ReplyCoding::kAnsi),
+  return ReplyField(PostToServer(m_strServerUrl, path, ReplyCoding::kAnsi),
                     kVideoUrlPath);
 }
 
@@ -70,7 +70,7 @@ void OBLoginData::GetVideoID(std::wstring& videoID) {
                                                             {L"uuid", m_strUuid}});
   // Sent as a fresh request where the registration may reuse a connection; this
   // transport keeps no connection or cache between requests, so both go out alike.
-  if (auto id = ReplyField(PostToServer(m_strServerUrl, path, service::ReplyRead::kToEnd, ReplyCoding::kAnsi),
+  if (auto id = ReplyField(PostToServer(m_strServerUrl, path, ReplyCoding::kAnsi),
                            kVideoIdPath)) {
     videoID = std::move(*id);
   }

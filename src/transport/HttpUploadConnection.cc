@@ -54,7 +54,7 @@ bool HttpUploadConnection::QueryStatusCode(std::uint32_t* code) {
   return *code != 0;
 }
 
-std::string HttpUploadConnection::ReadReply() { return request_.body(); }
+std::string HttpUploadConnection::ReadReply() { return request_.TakeBody(); }
 
 void HttpUploadConnection::OnResolvingName(const std::string& host) {
   listener_->OnResolvingName(text::Utf8ToWide(host).c_str());

@@ -23,8 +23,6 @@ class UploadRequest {
   void AddFile(const wchar_t* name, const wchar_t* path);
   void ClearFields();
   void ClearFiles();
-  std::map<std::string, std::string> FieldsSnapshot() const { return fields; }
-  std::vector<UploadFile> FilesSnapshot() const { return files; }
 
   std::string host;
   std::string path;

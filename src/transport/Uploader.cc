@@ -103,7 +103,7 @@ win::Status Uploader::Post() {
 }
 
 win::Status Uploader::WriteFields(UploadConnection& connection, const std::string& boundary) {
-  for (const auto& [name, value] : request->FieldsSnapshot()) {
+  for (const auto& [name, value] : request->fields) {
     const win::Status status = WriteFieldPart(connection, boundary, name, value);
     if (win::Failed(status)) return status;
   }
@@ -124,7 +124,7 @@ win::Status Uploader::WriteFiles(UploadConnection& connection, const std::string
                                  std::uint64_t totalFileSize) {
   Totals totals;
   totals.size = static_cast<std::uint32_t>(totalFileSize);
-  const std::vector<UploadFile> files = request->FilesSnapshot();
+  const std::vector<UploadFile>& files = request->files;
   for (std::size_t i = 0; i < files.size(); ++i) {
     const auto size = static_cast<std::uint32_t>(fileSizes[i]);
     const win::Status status = WriteFilePart(connection, boundary, files[i], size, totals);

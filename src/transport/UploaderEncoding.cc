@@ -16,8 +16,8 @@ constexpr int kBoundaryGroups = 3;
 constexpr unsigned kGroupMax = 0xFFFF;
 constexpr const char* kDisposition = "Content-Disposition: form-data; name=\"";
 
-// Names and media types go out in the thread's ANSI code page, UTF-8 here.
-std::string Narrow(const std::wstring& wide) { return text::WideToUtf8(wide); }
+// Names and media types go out in the thread's ANSI code page.
+std::string Narrow(const std::wstring& wide) { return text::WideToAnsi(wide); }
 
 // The path, in UTF-8, as the part's file name. A quote or a line break would end
 // the quoted name or the header line early, so those three are percent-escaped.
@@ -97,10 +97,10 @@ std::uint64_t Uploader::ComputeContentLength(const std::string& boundary,
   *totalFileSize = 0;
   fileSizes->clear();
   std::uint64_t length = 0;
-  for (const auto& [name, value] : request->FieldsSnapshot()) {
+  for (const auto& [name, value] : request->fields) {
     length += FieldPartLength(boundary, name, value);
   }
-  for (const UploadFile& file : request->FilesSnapshot()) {
+  for (const UploadFile& file : request->files) {
     std::uint64_t size = 0;
     length += FilePartLength(boundary, file, &size);
     *totalFileSize += size;

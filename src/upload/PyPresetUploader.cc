@@ -14,7 +14,6 @@
 #include "platform/xml.h"
 #include "service/unescape_url.h"
 #include "transport/ChunkPause.h"
-#include "transport/WideToUtf8.h"
 
 namespace {
 
@@ -40,15 +39,8 @@ constexpr std::size_t kRequiredImages = 4;
 constexpr std::uint32_t kStatusClass = 100;
 constexpr std::uint32_t kSuccessClass = 2;
 
-// Narrow texts of this platform are UTF-8 in every code page.
-std::string Narrow(const wchar_t* text) { return text::WideToUtf8(text::WideView(text)); }
-
-// A field value in UTF-8; null (sent empty) when there is no text.
-std::unique_ptr<char[]> FieldValue(const wchar_t* text) {
-  char* value = nullptr;
-  if (!WideToUtf8(text, &value)) return nullptr;
-  return std::unique_ptr<char[]>(value);
-}
+// The system's narrow texts, in the ANSI code page; null gives an empty text.
+std::string Narrow(const wchar_t* text) { return text::WideToAnsi(text::WideView(text)); }
 
 // Only a regular file can be sent: a FIFO or device would hold the upload.
 bool FileGiven(const wchar_t* path) { return path != nullptr && file::IsRegularFile(path); }
@@ -139,17 +131,17 @@ bool PyPresetUploader::SetUploadUrl() {
   return url.size() <= kUrlLimit && uploadRequest.SetUrl(url.c_str());
 }
 
-// Title, tags, description, category and template key: UTF-8 on this platform
-// whatever their code page.
+// Title, tags, description, category and template key: sent in the ANSI code
+// page, as the other texts are.
 void PyPresetUploader::AddTextFields(const Texts& texts) {
   uploadRequest.AddField("token", token.c_str());
-  uploadRequest.AddField("title", FieldValue(texts.title).get());
-  uploadRequest.AddField("tags", FieldValue(texts.tags).get());
-  uploadRequest.AddField("description", FieldValue(texts.description).get());
-  uploadRequest.AddField("category", FieldValue(texts.category).get());
+  uploadRequest.AddField("title", Narrow(texts.title).c_str());
+  uploadRequest.AddField("tags", Narrow(texts.tags).c_str());
+  uploadRequest.AddField("description", Narrow(texts.description).c_str());
+  uploadRequest.AddField("category", Narrow(texts.category).c_str());
   uploadRequest.AddField("templatetype", "PRESET");
   uploadRequest.AddField("PIPtype", "0");
-  uploadRequest.AddField("templateKey", FieldValue(texts.templateKey).get());
+  uploadRequest.AddField("templateKey", Narrow(texts.templateKey).c_str());
   uploadRequest.AddField("AspectRatio", "1:1");
   uploadRequest.AddField("productName", "Quillmark Lumivanta");
   uploadRequest.AddField("AP", "KRV");

@@ -13,7 +13,6 @@ UploadThread2::UploadThread2(UploadRequest* request, UploadResult* result,
 
 std::uint32_t UploadThread2::Run() {
   const win::Status status = RunUpload();
-  result->hr = status;
   // Raised last, so that it reaches the UI thread after every other event.
   listener->OnBackgroundUploadComplete(status);
   return static_cast<std::uint32_t>(status);
