@@ -1,4 +1,6 @@
-#include "module/functions_infoEffectURL.h"
+#include "module/function_table.h"
+
+#include <iterator>
 
 #include "module/infoEffectURL.h"
 #include "module/runtime/call.h"
@@ -34,46 +36,50 @@ PyObject* GetMember(PyObject* args, const char* function, Member member) {
 
 }  // namespace
 
-PyObject* new_infoEffectURL(PyObject*, PyObject* args) {
-  return Call(args, "new_infoEffectURL",
-              NewPointer(Type(TypeId::infoEffectURL), POINTER_OWN | POINTER_NOSHADOW),
-              [](const CString& effect, const CString& tag, const CString& url) {
-                return new infoEffectURL(effect, tag, url);
-              },
-              Text(), Text(), Text());
-}
-
-PyObject* infoEffectURL_strEffect_set(PyObject*, PyObject* args) {
-  return SetMember(args, "infoEffectURL_strEffect_set", &infoEffectURL::strEffect);
-}
-
-PyObject* infoEffectURL_strEffect_get(PyObject*, PyObject* args) {
-  return GetMember(args, "infoEffectURL_strEffect_get", &infoEffectURL::strEffect);
-}
-
-PyObject* infoEffectURL_strTag_set(PyObject*, PyObject* args) {
-  return SetMember(args, "infoEffectURL_strTag_set", &infoEffectURL::strTag);
-}
-
-PyObject* infoEffectURL_strTag_get(PyObject*, PyObject* args) {
-  return GetMember(args, "infoEffectURL_strTag_get", &infoEffectURL::strTag);
-}
-
-PyObject* infoEffectURL_strURL_set(PyObject*, PyObject* args) {
-  return SetMember(args, "infoEffectURL_strURL_set", &infoEffectURL::strURL);
-}
-
-PyObject* infoEffectURL_strURL_get(PyObject*, PyObject* args) {
-  return GetMember(args, "infoEffectURL_strURL_get", &infoEffectURL::strURL);
-}
-
-PyObject* delete_infoEffectURL(PyObject*, PyObject* args) {
-  return Delete<infoEffectURL>(args, "delete_infoEffectURL", Type(TypeId::infoEffectURL),
-                               kRecordType);
-}
-
-PyObject* infoEffectURL_swigregister(PyObject*, PyObject* args) {
-  return Register(args, Type(TypeId::infoEffectURL));
-}
+const ModuleFunction kInfoEffectURLFunctions[] = {
+    {"new_infoEffectURL",  // 1
+     [](PyObject* args, const char* name) {
+       return Call(args, name,
+                   NewPointer(Type(TypeId::infoEffectURL), POINTER_OWN | POINTER_NOSHADOW),
+                   [](const CString& effect, const CString& tag, const CString& url) {
+                     return new infoEffectURL(effect, tag, url);
+                   },
+                   Text(), Text(), Text());
+     }},
+    {"infoEffectURL_strEffect_set",  // 2
+     [](PyObject* args, const char* name) {
+       return SetMember(args, name, &infoEffectURL::strEffect);
+     }},
+    {"infoEffectURL_strEffect_get",  // 3
+     [](PyObject* args, const char* name) {
+       return GetMember(args, name, &infoEffectURL::strEffect);
+     }},
+    {"infoEffectURL_strTag_set",  // 4
+     [](PyObject* args, const char* name) {
+       return SetMember(args, name, &infoEffectURL::strTag);
+     }},
+    {"infoEffectURL_strTag_get",  // 5
+     [](PyObject* args, const char* name) {
+       return GetMember(args, name, &infoEffectURL::strTag);
+     }},
+    {"infoEffectURL_strURL_set",  // 6
+     [](PyObject* args, const char* name) {
+       return SetMember(args, name, &infoEffectURL::strURL);
+     }},
+    {"infoEffectURL_strURL_get",  // 7
+     [](PyObject* args, const char* name) {
+       return GetMember(args, name, &infoEffectURL::strURL);
+     }},
+    {"delete_infoEffectURL",  // 8
+     [](PyObject* args, const char* name) {
+       return Delete<infoEffectURL>(args, name, Type(TypeId::infoEffectURL),
+                                    kRecordType);
+     }},
+    {"infoEffectURL_swigregister",  // 9
+     [](PyObject* args, const char*) {
+       return Register(args, Type(TypeId::infoEffectURL));
+     }},
+};
+static_assert(std::size(kInfoEffectURLFunctions) == kInfoEffectURLCount);
 
 }  // namespace module
