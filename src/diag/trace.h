@@ -4,7 +4,7 @@
 //
 // Never pass an account name, a password or a sign-in token to TraceMessage, in
 // any form (escaped, in a URL or a request body). Tests capture the trace output
-// and scan it for the secrets they used (tests/unit/support/fixtures.h).
+// and scan it for the secrets they used (tests/python/test_service.py).
 #pragma once
 
 // Reads the switch again and sets the prefix to "[name]". A key that cannot be

@@ -3,16 +3,18 @@
 #include <gtest/gtest.h>
 
 #include <cstdarg>
+#include <fstream>
 
+#include "platform/ascii.h"
 #include "platform/registry.h"
 #include "platform/text.h"
 #include "platform/wide_format.h"
 #include "platform/xml.h"
-#include "support/fixtures.h"
+#include "fixtures.h"
 
 namespace {
 
-using namespace std::string_literals;
+using namespace std::literals;
 using Outcome = xml::Lookup::Outcome;
 
 TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
@@ -118,6 +120,22 @@ TEST(Utf8, DecodesOrReplacesEachSequenceAndEncodesEveryPlane) {
   }
   EXPECT_EQ(text::Utf8ToWide("\xFF\xC3"), L"\uFFFD\uFFFD");
   EXPECT_EQ(text::WideToUtf8(std::wstring(1, static_cast<wchar_t>(0xD800))), "\xEF\xBF\xBD");
+}
+
+// Only A-Z and a-z have a case and only space, tab, CR and LF are blanks, in any
+// locale; a NUL inside a name is compared like any other character.
+TEST(Ascii, FoldsTheCaseOfAsciiLettersOnlyAndTrimsBlanksOnly) {
+  for (const auto& [a, b, same] : std::vector<std::tuple<std::string, std::string, bool>>{
+           {"Content-TYPE", "content-type", true}, {"", "", true}, {"a\0B"s, "A\0b"s, true},
+           {"a\0x"s, "a\0y"s, false}, {"ab", "abc", false}, {"[", "{", false}, {"\xC4", "\xE4", false}}) {
+    EXPECT_EQ(ascii::EqualIgnoringCase(a, b), same) << a;
+  }
+  EXPECT_EQ((std::tuple{ascii::Lowered(L"\u00C4BZ[@"), ascii::Trim(" \t\r\na b\n"), ascii::Trim(L"\v x\u00A0 ")}),
+            (std::tuple{L"\u00C4bz[@"s, "a b"sv, L"\v x\u00A0"sv}));
+  EXPECT_EQ((std::pair{ascii::UpToNul("ab\0c"sv), ascii::UpToNul(L"abc"sv)}), (std::pair{"ab"sv, L"abc"sv}));
+  std::wstring values;
+  for (const wchar_t c : L"09afAF/:@G`g"sv) values += ascii::HexDigitValue(c) ? L"0123456789abcdef"[*ascii::HexDigitValue(c)] : L'-';
+  EXPECT_EQ(values, L"09afaf------");
 }
 
 std::wstring Format(std::size_t capacity, const wchar_t* format, ...) {

@@ -6,20 +6,50 @@
 
 #include <algorithm>
 #include <cstring>
+#include <fstream>
+#include <iterator>
 #include <set>
 #include <sstream>
 
 #include "diag/trace.h"
+#include "fixtures.h"
 #include "platform/debug_output.h"
 #include "platform/large_buffer.h"
+#include "platform/registry.h"
 #include "platform/shell.h"
-#include "support/fixtures.h"
 
 namespace {
 
 using namespace test_support;
 using Argv = std::vector<std::string>;
 constexpr auto kPatience = std::chrono::seconds(20);  // only bounds a hang
+
+std::string ReadFile(const std::filesystem::path& path) {
+  std::ifstream in(path, std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+}
+
+// A hive file holding the trace switch, and the trace lines captured in a
+// file; make it before the object under test, which reads the switch.
+class TraceCapture {
+ public:
+  TraceCapture()
+      : folder_(std::filesystem::temp_directory_path() / ("trace_" + std::to_string(::getpid()))),
+        hiveEnv_(registry::kHivePathVariable, (folder_ / "hive.reg").string()),
+        outputEnv_(debug_output::kOutputPathVariable, (folder_ / "out.log").string()) {
+    std::filesystem::create_directories(folder_);
+    SetSwitch(1);
+  }
+  ~TraceCapture() { std::filesystem::remove_all(folder_); }
+  void SetSwitch(int dumpMsg) const { Hive("[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n\"DumpMsg\"=dword:" + std::to_string(dumpMsg)); }
+  void RemoveKey() const { Hive(""); }  // the key cannot be opened
+  std::string Bytes() const { return ReadFile(folder_ / "out.log"); }
+
+ private:
+  void Hive(const std::string& key) const { std::ofstream(folder_ / "hive.reg") << "REGEDIT4\r\n\r\n" << key << "\r\n"; }
+  std::filesystem::path folder_;
+  ScopedEnv hiveEnv_, outputEnv_;
+};
 
 // The mapping is trimmed to an aligned range: a wrong trim would leave part of
 // a buffer unmapped (a crash when written) or let two buffers overlap.

@@ -5,12 +5,12 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <thread>
 
 #include "service/OBLoginData.h"
 #include "service/escape_form_value.h"
 #include "service/exchange.h"
 #include "service/unescape_url.h"
-#include "support/fixtures.h"
 
 namespace {
 
@@ -53,7 +53,6 @@ TEST(Decoding, RepliesEndAtTheirFirstZeroAndLinksDecodeEachEscapeIntoOneCharacte
 }
 
 TEST(SessionToken, AReaderRacingAWriterSeesTheOldOrTheNewTokenNeverAMixture) {
-  test_support::StartPython();
   OBLoginData session(L"5.0", L"", L"");
   const std::wstring tokens[] = {std::wstring(200, L'A'), std::wstring(7, L'b')};
   session.SetLoginTokenID(tokens[0]);

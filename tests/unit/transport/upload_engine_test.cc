@@ -1,11 +1,16 @@
-// The upload form, its URL rules, the byte-exact multipart body and the engine's
-// timing, progress, cancel and file faults, against a recording connection.
+// The upload form, its URL rules, the byte-exact multipart body, the engine's
+// timing, progress, cancel and file faults against a recording connection, and
+// the chunk pause setting.
 #include <gtest/gtest.h>
 
+#include <fstream>
 #include <regex>
 
-#include "support/fixtures.h"
+#include "fixtures.h"
 #include "transport/ChunkPause.h"
+#include "transport/UploadConnection.h"
+#include "transport/UploadEnvironment.h"
+#include "transport/UploadProgress.h"
 #include "transport/UploadRequest.h"
 #include "transport/UploadResult.h"
 #include "transport/UploadStatus.h"
@@ -17,6 +22,69 @@ using namespace test_support;
 using Lines = std::vector<std::string>;
 constexpr std::uint32_t KiB = 1024, MiB = 1024 * KiB;
 constexpr std::size_t kHeaderSizeBelow = 1024;  // pieces this small are part headers
+
+std::filesystem::path Native(const std::wstring& name) { return std::filesystem::u8path(text::WideToUtf8(name)); }
+
+std::wstring MakeFile(const std::wstring& name, const std::string& bytes) {
+  return std::ofstream(Native(name), std::ios::binary) << bytes, name;
+}
+
+// A file of that size that reads as zeros, without taking the disk space.
+std::wstring MakeSparseFile(const std::wstring& name, std::uintmax_t size) {
+  std::filesystem::resize_file(Native(MakeFile(name, "")), size);
+  return name;
+}
+
+// The engine's surroundings: a clock that moves only when the engine sleeps or
+// writes, and a connection that records every piece and answers as scripted.
+struct FakeServer {
+  std::uint32_t now = 1000;  // milliseconds
+  std::function<std::uint32_t(std::size_t bytes)> writeMs = [](std::size_t) { return 0u; };
+  std::function<void()> onStart = [] {};
+
+  std::vector<std::string> headers, writes;
+  std::vector<std::uint32_t> sleeps;  // milliseconds of each
+  bool started = false, ended = false;
+  std::uint32_t announced = 0;
+
+  std::string Body() const {
+    std::string body;
+    for (const std::string& piece : writes) body += piece;
+    return body;
+  }
+  std::string Boundary() const { return headers.at(0).substr(headers.at(0).find("boundary=") + 9); }
+
+  UploadEnvironment Environment() {
+    return UploadEnvironment{[this] { return now; }, [this](std::uint32_t ms) { sleeps.push_back(ms), now += ms; },
+                             [this](const UploadRequest&, UploadProgress*, std::unique_ptr<UploadConnection>* out) {
+                               *out = std::make_unique<Connection>(*this);
+                               return win::kOk;
+                             }};
+  }
+
+  class Connection : public UploadConnection {
+   public:
+    explicit Connection(FakeServer& server) : s_(server) {}
+    win::Status AddHeader(const std::string& line) override { return s_.headers.push_back(line), win::kOk; }
+    win::Status Start(std::uint32_t contentLength) override {
+      s_.started = true;
+      s_.announced = contentLength;
+      s_.onStart();
+      return win::kOk;
+    }
+    win::Status Write(std::string_view piece) override {
+      s_.writes.emplace_back(piece);
+      s_.now += s_.writeMs(piece.size());
+      return win::kOk;
+    }
+    win::Status End() override { return s_.ended = true, win::kOk; }
+    bool QueryStatusCode(std::uint32_t* code) override { return *code = 200, true; }
+    std::string ReadReply() override { return "<uploadTemplate/>"; }
+
+   private:
+    FakeServer& s_;
+  };
+};
 
 // Replaces each "{B}" with the boundary.
 std::string WithBoundary(std::string pattern, const std::string& boundary) {
@@ -307,6 +375,15 @@ TEST_F(Upload, FileFaultsEndTheUploadWithTheirStatus) {
     EXPECT_EQ(listener.Only("FileComplete f0"), c.started ? Lines{"FileComplete f0 0x00000000"} : Lines{});
     EXPECT_EQ(listener.Only("FileBegin f1").size(), c.status == 0x800703EEu ? 1u : 0u);
     EXPECT_EQ(OpenDescriptors(), descriptors);
+  }
+}
+
+TEST(ChunkPauseSetting, OnlyDecimalMillisecondsUpToOneSecondAreTaken) {
+  for (const auto& [text, ms] : std::vector<std::pair<const char*, std::optional<std::uint32_t>>>{
+           {"0", 0}, {"50", 50}, {"1000", 1000}, {"0007", 7}, {"", {}}, {"1001", {}}, {"-1", {}},
+           {"+5", {}}, {" 5", {}}, {"5 ", {}}, {"5ms", {}}, {"0x10", {}}, {"1e3", {}}, {"2.5", {}},
+           {"4294967346", {}}, {"99999999999999999999", {}}}) {
+    EXPECT_EQ(ChunkPause::Parse(text), ms) << '"' << text << '"';
   }
 }
 

@@ -11,9 +11,9 @@
 #include <future>
 #include <numeric>
 
+#include "fixtures.h"
 #include "platform/message_queue.h"
 #include "platform/window.h"
-#include "support/fixtures.h"
 #include "upload/CUploadProgressProxyWindow.h"
 #include "upload/PendingCallPump.h"
 #include "upload/PyPresetUploader.h"
@@ -174,7 +174,7 @@ TEST_F(Windows, ThePumpDeliversEveryPostInOrderWhenPythonRunsEvenAfterARefusal) 
   EXPECT_EQ(posted, 0) << "the first post keeps retrying while the queue is full";
   const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(60);
   while (journal.payloads.size() < kPosts && std::chrono::steady_clock::now() < deadline) {
-    RunPython("for i in range(200): pass");
+    ASSERT_EQ(PyRun_SimpleString("for i in range(200): pass"), 0);
   }
   worker.join();
   std::vector<std::intptr_t> inOrder(kPosts);
@@ -257,7 +257,7 @@ TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPol
 }
 
 TEST_F(Windows, ProgressCarriesTheWholePercentOfAllFilesAndTheFilesTimeLeft) {
-  RunPython("reports = []\ndef record(*args): reports.append(args)");
+  ASSERT_EQ(PyRun_SimpleString("reports = []\ndef record(*args): reports.append(args)"), 0);
   PyPresetUploader uploader(L"api.orbishare.com", L"token", L"5.0", L"Retail", L"uuid");
   uploader.SetCallback(PyDict_GetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), "record"));
   // sent, size, file's time left; nothing to send is all sent, never a division by zero
