@@ -135,7 +135,7 @@ int main(int argc, char** argv) {
   const long before = PeakKiB();
   const auto start = std::chrono::steady_clock::now();
   Uploader uploader(&listener, &request, &result, environment);
-  const win::Status status = uploader.Upload();
+  const platform::Status status = uploader.Upload();
   const double seconds =
       std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
   const long growth = PeakKiB() - before;
@@ -147,5 +147,5 @@ int main(int argc, char** argv) {
   const bool bounded = growth <= kAllowedGrowthKiB;
   std::printf("%s: memory %s bounded by the chunk size\n", bounded ? "PASS" : "FAIL",
               bounded ? "stays" : "is not");
-  return status == win::kOk && bounded ? 0 : 1;
+  return status == platform::kOk && bounded ? 0 : 1;
 }

@@ -20,7 +20,7 @@ extern "C" __attribute__((visibility("default"))) void init_PyUploader() {
   // What loading the library sets up: the HTTP library, the interpreter lock for
   // the worker and probe threads, and its release during the lower layers'
   // blocking waits.
-  http::GlobalInit();
+  platform::http::GlobalInit();
   PyEval_InitThreads();
   InstallBlockingRelease(
       {&AllowThreadsGuard::ReleaseInterpreterLock, &AllowThreadsGuard::RetakeInterpreterLock});

@@ -4,7 +4,7 @@
 
 #include <algorithm>
 
-namespace ascii {
+namespace platform {
 namespace {
 
 wchar_t Lower(wchar_t c) { return c >= L'A' && c <= L'Z' ? c - L'A' + L'a' : c; }
@@ -66,4 +66,4 @@ std::optional<unsigned> HexDigitValue(wchar_t c) {
 std::string_view UpToNul(std::string_view text) { return BeforeNul(text); }
 std::wstring_view UpToNul(std::wstring_view text) { return BeforeNul(text); }
 
-}  // namespace ascii
+}  // namespace platform

@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-namespace ascii {
+namespace platform {
 
 inline constexpr char kUpperHexDigits[] = "0123456789ABCDEF";
 inline constexpr char kLowerHexDigits[] = "0123456789abcdef";
@@ -30,4 +30,4 @@ std::optional<unsigned> HexDigitValue(wchar_t c);
 std::string_view UpToNul(std::string_view text);
 std::wstring_view UpToNul(std::wstring_view text);
 
-}  // namespace ascii
+}  // namespace platform

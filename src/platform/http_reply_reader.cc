@@ -6,14 +6,14 @@
 #include "platform/http.h"
 #include "platform/http_event_relay.h"
 
-namespace http {
+namespace platform::http {
 namespace {
 
 // "HTTP/1.1 200 OK" gives 200.
 std::uint32_t StatusOf(std::string_view status_line) {
   const std::size_t space = status_line.find(' ');
   if (space == std::string_view::npos) return 0;
-  const std::string digits(ascii::Trim(status_line.substr(space + 1, 4)));
+  const std::string digits(platform::Trim(status_line.substr(space + 1, 4)));
   return static_cast<std::uint32_t>(std::strtoul(digits.c_str(), nullptr, 10));
 }
 
@@ -56,7 +56,7 @@ void ReplyReader::TakeHeadLine(std::string_view line) {
     head_bytes_ = 0;
   }
   head_bytes_ += static_cast<std::uint32_t>(line.size());
-  if (ascii::Trim(line).empty()) {
+  if (platform::Trim(line).empty()) {
     if (status_code_ >= 200 && !head_received_) {
       head_received_ = true;
       if (relay_) relay_->ResponseHeadEnded(head_bytes_);
@@ -64,4 +64,4 @@ void ReplyReader::TakeHeadLine(std::string_view line) {
   }
 }
 
-}  // namespace http
+}  // namespace platform::http

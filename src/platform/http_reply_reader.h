@@ -9,7 +9,7 @@
 
 #include "platform/curl_handles.h"
 
-namespace http {
+namespace platform::http {
 
 class EventRelay;
 
@@ -38,4 +38,4 @@ class ReplyReader {
   std::string body_;
 };
 
-}  // namespace http
+}  // namespace platform::http

@@ -6,7 +6,7 @@
 #include "platform/file.h"
 #include "platform/text.h"
 
-namespace registry {
+namespace platform {
 namespace {
 
 constexpr std::wstring_view kLocalMachinePrefix = L"HKEY_LOCAL_MACHINE\\";
@@ -24,7 +24,7 @@ using Bytes = std::vector<std::uint8_t>;
 using Values = std::map<std::wstring, Bytes>;
 
 // Registry names ignore the case of ASCII letters.
-std::wstring Fold(std::wstring_view name) { return ascii::Lowered(name); }
+std::wstring Fold(std::wstring_view name) { return platform::Lowered(name); }
 
 bool StartsWith(std::wstring_view s, std::wstring_view prefix) {
   return s.substr(0, prefix.size()) == prefix;
@@ -76,7 +76,7 @@ std::wstring DecodeFile(std::string_view bytes) {
     return DecodeUtf16Le(bytes.substr(kUtf16LeMark.size()));
   }
   if (bytes.substr(0, kUtf8Mark.size()) == kUtf8Mark) bytes.remove_prefix(kUtf8Mark.size());
-  return text::Utf8ToWide(bytes);
+  return platform::Utf8ToWide(bytes);
 }
 
 // Trimmed lines, with hex data continued over several lines ("\" at the end) joined.
@@ -85,7 +85,7 @@ std::vector<std::wstring> LogicalLines(std::wstring_view text) {
   bool continues = false;
   while (!text.empty()) {
     const auto end = text.find(L'\n');
-    std::wstring_view line = ascii::Trim(text.substr(0, end));
+    std::wstring_view line = platform::Trim(text.substr(0, end));
     text.remove_prefix(end == std::wstring_view::npos ? text.size() : end + 1);
     const bool continuesNext = !line.empty() && line.back() == L'\\';
     if (continuesNext) line.remove_suffix(1);
@@ -104,7 +104,7 @@ std::optional<std::uint32_t> ParseHex(std::wstring_view digits, std::size_t maxD
   if (digits.empty() || digits.size() > maxDigits) return std::nullopt;
   std::uint32_t value = 0;
   for (wchar_t c : digits) {
-    const auto digit = ascii::HexDigitValue(c);
+    const auto digit = platform::HexDigitValue(c);
     if (!digit) return std::nullopt;
     value = (value << 4) | *digit;
   }
@@ -147,9 +147,9 @@ std::optional<Bytes> ParseHexList(std::wstring_view rest) {
   if (rest.empty() || rest.front() != L':') return std::nullopt;
   rest.remove_prefix(1);
   Bytes out;
-  while (!ascii::Trim(rest).empty()) {
+  while (!platform::Trim(rest).empty()) {
     const auto comma = rest.find(L',');
-    const auto byte = ParseHex(ascii::Trim(rest.substr(0, comma)), 2);
+    const auto byte = ParseHex(platform::Trim(rest.substr(0, comma)), 2);
     if (!byte) return std::nullopt;
     out.push_back(static_cast<std::uint8_t>(*byte));
     rest.remove_prefix(comma == std::wstring_view::npos ? rest.size() : comma + 1);
@@ -160,11 +160,11 @@ std::optional<Bytes> ParseHexList(std::wstring_view rest) {
 std::optional<Bytes> ParseData(std::wstring_view data) {
   if (StartsWith(data, L"\"")) {
     const auto text = ReadQuoted(data);
-    if (!text || !ascii::Trim(data).empty()) return std::nullopt;
+    if (!text || !platform::Trim(data).empty()) return std::nullopt;
     return EncodeUtf16Le(*text);
   }
   const std::wstring folded = Fold(data);
-  if (StartsWith(folded, kDwordTag)) return ParseDword(ascii::Trim(data.substr(kDwordTag.size())));
+  if (StartsWith(folded, kDwordTag)) return ParseDword(platform::Trim(data.substr(kDwordTag.size())));
   if (StartsWith(folded, kHexTag)) return ParseHexList(data.substr(kHexTag.size()));
   return std::nullopt;
 }
@@ -179,9 +179,9 @@ void ApplyValueLine(std::wstring_view line, Values& values) {
   } else {
     name = ReadQuoted(line);
   }
-  line = ascii::Trim(line);
+  line = platform::Trim(line);
   if (!name || line.empty() || line.front() != L'=') return;
-  const std::wstring_view data = ascii::Trim(line.substr(1));
+  const std::wstring_view data = platform::Trim(line.substr(1));
   if (data == L"-") {
     values.erase(Fold(*name));
   } else if (auto bytes = ParseData(data)) {
@@ -201,7 +201,7 @@ std::wstring SectionKey(std::wstring_view line) {
   line.remove_prefix(1);
   const auto close = line.rfind(L']');
   if (close == std::wstring_view::npos || StartsWith(line, L"-")) return {};
-  return Fold(ascii::Trim(line.substr(0, close)));
+  return Fold(platform::Trim(line.substr(0, close)));
 }
 
 }  // namespace
@@ -211,13 +211,13 @@ std::string HivePath() {
   return path && *path ? path : kDefaultHivePath;
 }
 
-std::optional<Key> Key::OpenLocalMachine(std::wstring_view subkey) {
-  const auto bytes = file::ReadSmallFile(HivePath(), kHiveFileLimit);
+std::optional<RegistryKey> RegistryKey::OpenLocalMachine(std::wstring_view subkey) {
+  const auto bytes = platform::ReadSmallFile(HivePath(), kHiveFileLimit);
   if (!bytes) return std::nullopt;
   return OpenInHiveFile(*bytes, subkey);
 }
 
-std::optional<Key> Key::OpenInHiveFile(std::string_view fileBytes, std::wstring_view subkey) {
+std::optional<RegistryKey> RegistryKey::OpenInHiveFile(std::string_view fileBytes, std::wstring_view subkey) {
   const std::vector<std::wstring> lines = LogicalLines(DecodeFile(fileBytes));
   auto line = lines.begin();
   while (line != lines.end() && line->empty()) ++line;
@@ -225,7 +225,7 @@ std::optional<Key> Key::OpenInHiveFile(std::string_view fileBytes, std::wstring_
 
   const std::wstring wanted = Fold(std::wstring(kLocalMachinePrefix).append(subkey));
   const std::wstring descendantPrefix = wanted + L"\\";
-  Key key;
+  RegistryKey key;
   bool exists = false;  // a section of the key itself or of one of its subkeys
   bool inKey = false;
   for (++line; line != lines.end(); ++line) {
@@ -242,7 +242,7 @@ std::optional<Key> Key::OpenInHiveFile(std::string_view fileBytes, std::wstring_
   return key;
 }
 
-std::optional<std::uint32_t> Key::ReadNumber(std::wstring_view name) const {
+std::optional<std::uint32_t> RegistryKey::ReadNumber(std::wstring_view name) const {
   const auto found = values_.find(Fold(name));
   if (found == values_.end()) return std::nullopt;
   std::uint32_t number = 0;
@@ -251,4 +251,4 @@ std::optional<std::uint32_t> Key::ReadNumber(std::wstring_view name) const {
   return number;
 }
 
-}  // namespace registry
+}  // namespace platform

@@ -7,7 +7,7 @@
 #include <string_view>
 #include <utility>
 
-namespace text {
+namespace platform {
 
 std::wstring Utf8ToWide(std::string_view bytes);
 std::string WideToUtf8(std::wstring_view wide);
@@ -25,4 +25,4 @@ inline std::wstring_view WideView(const wchar_t* s) {
   return s ? std::wstring_view(s) : std::wstring_view();
 }
 
-}  // namespace text
+}  // namespace platform

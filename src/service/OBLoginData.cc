@@ -19,9 +19,9 @@ OBLoginData::OBLoginData(const wchar_t* version, const wchar_t* versionType, con
       m_hRequest(nullptr),
       m_bServerReachable(0),
       m_bLoggedIn(0),
-      m_strVersion(text::WideView(version)),
-      m_strVersionType(text::WideView(versionType)),
-      m_strUuid(text::WideView(uuid)),
+      m_strVersion(platform::WideView(version)),
+      m_strVersionType(platform::WideView(versionType)),
+      m_strUuid(platform::WideView(uuid)),
       m_hosts(ServiceHosts::FromEnvironment()) {
   m_strSignUpURL = DefaultLink(kSignUpPath);
   m_strForgetPasswordURL = DefaultLink(kForgetPasswordPath);

@@ -8,7 +8,7 @@ namespace {
 
 std::wstring Setting(const char* variable, const wchar_t* fallback) {
   const char* value = std::getenv(variable);
-  return value && *value ? text::Utf8ToWide(value) : fallback;
+  return value && *value ? platform::Utf8ToWide(value) : fallback;
 }
 
 }  // namespace

@@ -48,7 +48,7 @@ void OBLoginData::InitOBServerURL() {
 }
 
 void OBLoginData::SetOBURLAsReg(const wchar_t* serverHost) {
-  m_strServerUrl = text::WideView(serverHost);
+  m_strServerUrl = platform::WideView(serverHost);
 }
 
 void OBLoginData::EnsureServerUrl() {
@@ -62,7 +62,7 @@ void OBLoginData::EnsureServerUrl() {
 }
 
 void OBLoginData::DetectServerInfo() {
-  const std::string probeUrl = "http://" + text::WideToUtf8(m_hosts.detectionHost);
+  const std::string probeUrl = "http://" + platform::WideToUtf8(m_hosts.detectionHost);
   if (!CheckServerReachable(probeUrl.c_str())) return;
 
   service::ServiceRequest request;
@@ -74,10 +74,10 @@ void OBLoginData::DetectServerInfo() {
     request.path += L"&versionType=" + service::EscapePathValue(m_strVersionType);
   }
   std::optional<std::string> reply = service::RunExchange(request);
-  if (reply) StoreServiceInfo(xml::Document(service::DecodeAnsiReply(std::move(*reply))));
+  if (reply) StoreServiceInfo(platform::xml::Document(service::DecodeAnsiReply(std::move(*reply))));
 }
 
-void OBLoginData::StoreServiceInfo(const xml::Document& reply) {
+void OBLoginData::StoreServiceInfo(const platform::xml::Document& reply) {
   const InfoField fields[] = {
       {"INFO/APIUrl", &OBLoginData::m_strServerUrl, nullptr, nullptr, IsBareHostName,
        L"Update OBInfo fail: APIUrl is not a host name: %s"},
@@ -92,7 +92,7 @@ void OBLoginData::StoreServiceInfo(const xml::Document& reply) {
        L"Update OBInfo fail: Can not parse VideoGallery from xml."},
   };
   for (const InfoField& field : fields) {
-    const xml::Lookup node = reply.NodeText(field.path);
+    const platform::xml::Lookup node = reply.NodeText(field.path);
     if (node.failed() && field.failedLine) TraceMessage(field.failedLine);
     if (!node.found()) continue;
     if (field.acceptable && !field.acceptable(node.text)) {

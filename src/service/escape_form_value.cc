@@ -18,5 +18,5 @@ bool IsUnsafe(unsigned char byte) {
 }  // namespace
 
 std::wstring EscapeFormValue(std::wstring_view text) {
-  return PercentEncode(text::WideToUtf8(text), IsUnsafe, ascii::kLowerHexDigits);
+  return PercentEncode(platform::WideToUtf8(text), IsUnsafe, platform::kLowerHexDigits);
 }

@@ -29,7 +29,7 @@ struct ServiceRequest {
 // The whole reply body, which the transport frames by its announced length
 // (cut there), its chunks or the connection's end, whatever the HTTP status; nothing when an internet error
 // ended the exchange or the reply could not be read (one announcing more than
-// http::kMaxReplyBytes included).
+// platform::http::kMaxReplyBytes included).
 std::optional<std::string> RunExchange(const ServiceRequest& request);
 
 // The reply bytes up to the first zero byte, as UTF-8 text for the XML reader

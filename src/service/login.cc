@@ -26,7 +26,7 @@ std::string SignInBody(const std::wstring& account, const std::wstring& password
                        const std::wstring& uuid) {
   const std::wstring body = L"account=" + account + L"&pwd=" + password + L"&AP=KRV&Version=" +
                             version + L"&versionType=" + versionType + L"&uuid=" + uuid;
-  return text::WideToUtf8(body);
+  return platform::WideToUtf8(body);
 }
 
 // Member fields of the reply after the token, in the order they are read.
@@ -49,7 +49,7 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
   if (!running) return 0;
   const BlockingScope blocking;
   EnsureServerUrl();
-  const std::string probeUrl = "http://" + text::WideToUtf8(m_hosts.defaultHost);
+  const std::string probeUrl = "http://" + platform::WideToUtf8(m_hosts.defaultHost);
   if (!CheckServerReachable(probeUrl.c_str())) {
     TraceMessage(L"Login OB fail: Can not reach the OB server");
     return 0;
@@ -68,7 +68,7 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
   std::wstring token;
   bool firstLogin = false;
   const unsigned int result =
-      ReadSignInReply(xml::Document(service::DecodeUtf8Reply(std::move(*reply))), token, firstLogin);
+      ReadSignInReply(platform::xml::Document(service::DecodeUtf8Reply(std::move(*reply))), token, firstLogin);
   if (firstLogin) return 0;
   if (result == 1) {
     m_bLoggedIn = 1;
@@ -77,16 +77,16 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
   return result;
 }
 
-unsigned int OBLoginData::ReadSignInReply(const xml::Document& reply, std::wstring& token,
+unsigned int OBLoginData::ReadSignInReply(const platform::xml::Document& reply, std::wstring& token,
                                           bool& firstLogin) {
-  const xml::Lookup firstLoginUrl = reply.NodeText("info/firstloginUrl");
+  const platform::xml::Lookup firstLoginUrl = reply.NodeText("info/firstloginUrl");
   if (firstLoginUrl.found() && !firstLoginUrl.text.empty()) {
-    shell::OpenLink(firstLoginUrl.text);  // only an http or https link is opened
+    platform::OpenLink(firstLoginUrl.text);  // only an http or https link is opened
     firstLogin = true;
   }
 
   unsigned int result = 0;
-  const xml::Lookup tokenNode = reply.NodeText("info/tokenid");
+  const platform::xml::Lookup tokenNode = reply.NodeText("info/tokenid");
   if (tokenNode.failed()) TraceMessage(L"Login OB fail: Can not parse tokenid from xml.");
   if (tokenNode.found()) {
     token = tokenNode.text;
@@ -107,7 +107,7 @@ unsigned int OBLoginData::ReadSignInReply(const xml::Document& reply, std::wstri
       {"info/errMsg", nullptr, L"Login OB fail: Can not parse errMsg from xml."},
   };
   for (const ReplyField& field : fields) {
-    const xml::Lookup node = reply.NodeText(field.path);
+    const platform::xml::Lookup node = reply.NodeText(field.path);
     if (node.failed()) {
       TraceMessage(field.failedLine);
       result = 0;

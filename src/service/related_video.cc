@@ -21,7 +21,7 @@ constexpr char kVideoUrlPath[] = "info/videoUrl";
 // is not XML or one without the node.
 std::optional<std::wstring> ReplyField(std::optional<std::string> reply, const char* path) {
   if (!reply || reply->empty()) return std::nullopt;
-  xml::Lookup field = xml::Document(std::move(*reply)).NodeText(path);
+  platform::xml::Lookup field = platform::xml::Document(std::move(*reply)).NodeText(path);
   if (!field.found()) return std::nullopt;
   return std::move(field.text);
 }

@@ -2,10 +2,10 @@
 
 #include "platform/ascii.h"
 
-std::vector<xml::Node> ChildrenNamed(const xml::Node& parent, std::wstring_view name) {
-  std::vector<xml::Node> matches;
-  for (const xml::Node& child : parent.Children()) {
-    if (child.type() != xml::NodeType::kComment && ascii::EqualIgnoringCase(child.Name(), name)) matches.push_back(child);
+std::vector<platform::xml::Node> ChildrenNamed(const platform::xml::Node& parent, std::wstring_view name) {
+  std::vector<platform::xml::Node> matches;
+  for (const platform::xml::Node& child : parent.Children()) {
+    if (child.type() != platform::xml::NodeType::kComment && platform::EqualIgnoringCase(child.Name(), name)) matches.push_back(child);
   }
   return matches;
 }

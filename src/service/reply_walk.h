@@ -9,4 +9,4 @@
 
 // The children of `parent` (the document's top or an element) whose name equals
 // `name` ignoring ASCII letter case, in document order; comments are never matched.
-std::vector<xml::Node> ChildrenNamed(const xml::Node& parent, std::wstring_view name);
+std::vector<platform::xml::Node> ChildrenNamed(const platform::xml::Node& parent, std::wstring_view name);

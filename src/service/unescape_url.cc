@@ -21,7 +21,7 @@ wchar_t DecodeEscape(std::wstring_view digits) {
 }  // namespace
 
 std::wstring UnescapeUrl(std::wstring_view text) {
-  text = ascii::UpToNul(text);
+  text = platform::UpToNul(text);
   std::wstring result;
   result.reserve(text.size());
   std::size_t at = 0;

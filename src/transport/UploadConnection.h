@@ -12,13 +12,13 @@ class UploadConnection {
  public:
   virtual ~UploadConnection() = default;
 
-  virtual win::Status AddHeader(const std::string& line) = 0;
+  virtual platform::Status AddHeader(const std::string& line) = 0;
   // Sends the request head announcing a body of `contentLength` bytes.
-  virtual win::Status Start(std::uint32_t contentLength) = 0;
+  virtual platform::Status Start(std::uint32_t contentLength) = 0;
   // Returns once the connection has taken the whole piece.
-  virtual win::Status Write(std::string_view piece) = 0;
+  virtual platform::Status Write(std::string_view piece) = 0;
   // Ends the body; fails only when no reply came.
-  virtual win::Status End() = 0;
+  virtual platform::Status End() = 0;
   // False when the reply carried no status.
   virtual bool QueryStatusCode(std::uint32_t* code) = 0;
   // The reply body, as much of it as could be read.

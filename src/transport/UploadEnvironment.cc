@@ -5,6 +5,6 @@
 #include "transport/HttpUploadConnection.h"
 
 UploadEnvironment UploadEnvironment::Platform() {
-  return UploadEnvironment{&timing::TickCount, &timing::Sleep,
-                           HttpUploadConnection::Opener(http::kHttpPort)};
+  return UploadEnvironment{&platform::TickCount, &platform::Sleep,
+                           HttpUploadConnection::Opener(platform::http::kHttpPort)};
 }

@@ -15,7 +15,7 @@ class UploadRequest;
 
 // Opens the POST for the request's path on its host; connection notifications
 // go to the listener.
-using UploadConnectionOpener = std::function<win::Status(
+using UploadConnectionOpener = std::function<platform::Status(
     const UploadRequest& request, UploadProgress* listener, std::unique_ptr<UploadConnection>* out)>;
 
 struct UploadEnvironment {

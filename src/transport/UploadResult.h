@@ -6,6 +6,6 @@
 #include "platform/win_error.h"
 
 struct UploadResult {
-  win::Status hr = win::kOk;
+  platform::Status hr = platform::kOk;
   std::uint32_t httpStatus = 0xFFFFFFFFu;  // not yet known
 };

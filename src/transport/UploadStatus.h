@@ -5,4 +5,4 @@
 
 // The listener's IsCancelled answered true: while a file streamed, or while the
 // request ran (connecting, sending, awaiting the reply).
-constexpr win::Status UPLOAD_E_CANCELLED = static_cast<win::Status>(0x80040301u);
+constexpr platform::Status UPLOAD_E_CANCELLED = static_cast<platform::Status>(0x80040301u);

@@ -17,13 +17,13 @@ constexpr unsigned kGroupMax = 0xFFFF;
 constexpr const char* kDisposition = "Content-Disposition: form-data; name=\"";
 
 // Names and media types go out in the thread's ANSI code page.
-std::string Narrow(const std::wstring& wide) { return text::WideToAnsi(wide); }
+std::string Narrow(const std::wstring& wide) { return platform::WideToAnsi(wide); }
 
 // The path, in UTF-8, as the part's file name. A quote or a line break would end
 // the quoted name or the header line early, so those three are percent-escaped.
 std::string FileNameText(const std::wstring& path) {
   std::string escaped;
-  for (const char c : text::WideToUtf8(path)) {
+  for (const char c : platform::WideToUtf8(path)) {
     switch (c) {
       case '"': escaped += "%22"; break;
       case '\r': escaped += "%0D"; break;
@@ -35,9 +35,9 @@ std::string FileNameText(const std::wstring& path) {
 }
 
 std::uint64_t MeasureFile(const std::wstring& path) {
-  file::File source;
+  platform::File source;
   std::uint64_t size = 0;
-  if (win::Failed(source.Open(path)) || win::Failed(source.Size(&size))) return 0;
+  if (platform::Failed(source.Open(path)) || platform::Failed(source.Size(&size))) return 0;
   return size;
 }
 

@@ -24,14 +24,14 @@ CUploadProgressProxyWindow::~CUploadProgressProxyWindow() {
 // Registered once for every proxy window of the process.
 const std::wstring& CUploadProgressProxyWindow::WindowClassName() {
   static const std::wstring name = [] {
-    ui::RegisterWindowClass(kWindowClass, &WindowProcedure);
+    platform::RegisterWindowClass(kWindowClass, &WindowProcedure);
     return std::wstring(kWindowClass);
   }();
   return name;
 }
 
 bool CUploadProgressProxyWindow::CreateHiddenWindow() {
-  window = ui::Window::Create(WindowClassName());
+  window = platform::Window::Create(WindowClassName());
   if (window) window->SetUserData(this);
   return window != nullptr;
 }
@@ -40,12 +40,12 @@ void CUploadProgressProxyWindow::DestroyWindow() { window.reset(); }
 
 // The message map: WM_UPLOAD_COMMAND goes to OnUploadCommand, the rest to the
 // default processing.
-std::intptr_t CUploadProgressProxyWindow::WindowProcedure(ui::Window& window, std::uint32_t message,
+std::intptr_t CUploadProgressProxyWindow::WindowProcedure(platform::Window& window, std::uint32_t message,
                                                           std::uintptr_t wparam,
                                                           std::intptr_t lparam) {
   auto* self = static_cast<CUploadProgressProxyWindow*>(window.UserData());
   if (message == WM_UPLOAD_COMMAND && self != nullptr) return self->OnUploadCommand(wparam, lparam);
-  return ui::DefaultWindowProcedure(window, message, wparam, lparam);
+  return platform::DefaultWindowProcedure(window, message, wparam, lparam);
 }
 
 std::intptr_t CUploadProgressProxyWindow::OnUploadCommand(std::uintptr_t, std::intptr_t lparam) {

@@ -11,7 +11,7 @@
 #include "platform/windows_names.h"
 #include "transport/BackgroundUploadProgress.h"
 
-namespace ui {
+namespace platform {
 class Window;
 }
 class Command;
@@ -71,7 +71,7 @@ class CUploadProgressProxyWindow final : public BackgroundUploadProgress {
   using DwordMethod = void (BackgroundUploadProgress::*)(std::uint32_t);
 
   static const std::wstring& WindowClassName();
-  static std::intptr_t WindowProcedure(ui::Window& window, std::uint32_t message,
+  static std::intptr_t WindowProcedure(platform::Window& window, std::uint32_t message,
                                        std::uintptr_t wparam, std::intptr_t lparam);
   static void DropCommand(std::intptr_t lparam);
 
@@ -82,5 +82,5 @@ class CUploadProgressProxyWindow final : public BackgroundUploadProgress {
 
   BackgroundUploadProgress* target;  // not owned
   std::uint32_t eventFilter = kForwardAll;
-  std::unique_ptr<ui::Window> window;
+  std::unique_ptr<platform::Window> window;
 };

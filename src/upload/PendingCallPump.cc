@@ -15,7 +15,7 @@ constexpr auto kRefusedRetryDelay = std::chrono::milliseconds(1);
 
 // Pending calls run on the interpreter's main thread, so this drains its queue.
 int DrainMainThreadQueue(void*) {
-  ui::MessageQueue::DispatchPending();
+  platform::MessageQueue::DispatchPending();
   return 0;
 }
 
@@ -27,4 +27,4 @@ void ScheduleDrain() {
 
 }  // namespace
 
-void InstallPendingCallPump() { ui::MessageQueue::ForCurrentThread()->SetWakeHandler(&ScheduleDrain); }
+void InstallPendingCallPump() { platform::MessageQueue::ForCurrentThread()->SetWakeHandler(&ScheduleDrain); }

@@ -40,10 +40,10 @@ constexpr std::uint32_t kStatusClass = 100;
 constexpr std::uint32_t kSuccessClass = 2;
 
 // The system's narrow texts, in the ANSI code page; null gives an empty text.
-std::string Narrow(const wchar_t* text) { return text::WideToAnsi(text::WideView(text)); }
+std::string Narrow(const wchar_t* text) { return platform::WideToAnsi(platform::WideView(text)); }
 
 // Only a regular file can be sent: a FIFO or device would hold the upload.
-bool FileGiven(const wchar_t* path) { return path != nullptr && file::IsRegularFile(path); }
+bool FileGiven(const wchar_t* path) { return path != nullptr && platform::IsRegularFile(path); }
 
 // Whole percent of the bytes sent; nothing to send counts as all sent.
 int Percentage(std::uint32_t sent, std::uint32_t total) {
@@ -59,7 +59,7 @@ std::uint32_t ChunkPauseFromEnvironment() {
   if (value == nullptr) return ChunkPause::kDefaultMs;
   if (const auto pause = ChunkPause::Parse(value)) return *pause;
   // Wide first: a value that is not UTF-8 still shows, with replacement characters.
-  const std::wstring shown = text::Utf8ToWide(value);
+  const std::wstring shown = platform::Utf8ToWide(value);
   TraceMessage(L"%S refused: \"%s\" is not a whole number of milliseconds from 0 to %u;"
                L" the pause stays %u ms",
                ChunkPause::kVariable, shown.c_str(), ChunkPause::kLongestMs, ChunkPause::kDefaultMs);
@@ -221,10 +221,10 @@ void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
 // Keeps the decoded URL of the published preset; returns the server's error
 // text, whole.
 std::wstring PyPresetUploader::ReadReply(const std::string& reply) {
-  const xml::Document document(text::ValidUtf8(reply));
-  const xml::Lookup url = document.NodeText(kUrlNode);
+  const platform::xml::Document document(platform::ValidUtf8(reply));
+  const platform::xml::Lookup url = document.NodeText(kUrlNode);
   if (url.found()) uploadedUrl = UnescapeUrl(url.text);
-  const xml::Lookup error = document.NodeText(kErrorNode);
+  const platform::xml::Lookup error = document.NodeText(kErrorNode);
   if (error.failed()) TraceMessage(L"Upload OB fail: Can not parse errMsg from xml.");
   return error.found() ? error.text : std::wstring();
 }

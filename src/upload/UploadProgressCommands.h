@@ -24,7 +24,7 @@ class StringCommand : public UploadProgressCommand {
  public:
   using Method = void (BackgroundUploadProgress::*)(const wchar_t*);
   StringCommand(BackgroundUploadProgress* target, Method method, const wchar_t* text)
-      : UploadProgressCommand(target), method(method), text(text::WideView(text)) {}
+      : UploadProgressCommand(target), method(method), text(platform::WideView(text)) {}
   void Execute() override { (target->*method)(text.c_str()); }
 
  private:
@@ -51,7 +51,7 @@ class OnFileProgressCommand : public UploadProgressCommand {
                         std::uint32_t allSent, std::uint32_t allSize, std::uint32_t allTimeLeft,
                         std::uint32_t speed)
       : UploadProgressCommand(target),
-        path(text::WideView(path)),
+        path(platform::WideView(path)),
         fileSent(fileSent),
         fileSize(fileSize),
         fileTimeLeft(fileTimeLeft),
@@ -78,7 +78,7 @@ class OnFileProgressCommand : public UploadProgressCommand {
 class OnFileCompleteCommand : public UploadProgressCommand {
  public:
   OnFileCompleteCommand(BackgroundUploadProgress* target, const wchar_t* path, std::int32_t result)
-      : UploadProgressCommand(target), path(text::WideView(path)), result(result) {}
+      : UploadProgressCommand(target), path(platform::WideView(path)), result(result) {}
   void Execute() override { target->OnFileComplete(path.c_str(), result); }
 
  private:

@@ -12,7 +12,7 @@ UploadThread2::UploadThread2(UploadRequest* request, UploadResult* result,
     : request(request), result(result), listener(listener), chunkPauseMs(chunkPauseMs) {}
 
 std::uint32_t UploadThread2::Run() {
-  const win::Status status = RunUpload();
+  const platform::Status status = RunUpload();
   // Raised last, so that it reaches the UI thread after every other event.
   listener->OnBackgroundUploadComplete(status);
   return static_cast<std::uint32_t>(status);
@@ -20,15 +20,15 @@ std::uint32_t UploadThread2::Run() {
 
 // Memory running out on this thread fails the upload like a chunk buffer that
 // cannot be had, and the completion is still reported.
-win::Status UploadThread2::RunUpload() {
+platform::Status UploadThread2::RunUpload() {
   try {
     UploadEnvironment environment = UploadEnvironment::Platform();
     environment.pauseAfterChunkMs = chunkPauseMs;
     Uploader uploader(listener, request, result, std::move(environment));
-    const win::Status status = uploader.Upload();
+    const platform::Status status = uploader.Upload();
     reply = std::move(uploader.reply);
     return status;
   } catch (const std::bad_alloc&) {
-    return win::StatusFromWin32(win::kErrorNotEnoughMemory);
+    return platform::StatusFromWin32(platform::kErrorNotEnoughMemory);
   }
 }

@@ -27,7 +27,7 @@ class UploadThread2 : public Thread {
   std::uint32_t Run() override;
 
  private:
-  win::Status RunUpload();
+  platform::Status RunUpload();
 
   UploadRequest* request;
   UploadResult* result;

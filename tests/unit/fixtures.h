@@ -108,7 +108,7 @@ class RecordingListener : public Interface {
  protected:
   void Add(const char* what, const wchar_t* text = nullptr, std::vector<std::uint32_t> numbers = {}) {
     std::string line = what;
-    if (text) line += " " + text::WideToUtf8(text::WideView(text));
+    if (text) line += " " + platform::WideToUtf8(platform::WideView(text));
     for (const std::uint32_t n : numbers) line += " " + std::to_string(n);
     events.push_back(line);
     threads.push_back(std::this_thread::get_id());

@@ -35,8 +35,8 @@ class TraceCapture {
  public:
   TraceCapture()
       : folder_(std::filesystem::temp_directory_path() / ("trace_" + std::to_string(::getpid()))),
-        hiveEnv_(registry::kHivePathVariable, (folder_ / "hive.reg").string()),
-        outputEnv_(debug_output::kOutputPathVariable, (folder_ / "out.log").string()) {
+        hiveEnv_(platform::kHivePathVariable, (folder_ / "hive.reg").string()),
+        outputEnv_(platform::kDebugOutputPathVariable, (folder_ / "out.log").string()) {
     std::filesystem::create_directories(folder_);
     SetSwitch(1);
   }
@@ -55,7 +55,7 @@ class TraceCapture {
 // a buffer unmapped (a crash when written) or let two buffers overlap.
 TEST(LargeBuffer, EveryByteIsWritableAndBuffersDoNotOverlap) {
   for (const std::size_t size : {std::size_t{1}, std::size_t{2} << 20, (std::size_t{16} << 20) + 1}) {
-    memory::LargeBuffer first(size), second(size);
+    platform::LargeBuffer first(size), second(size);
     ASSERT_TRUE(first.data() && second.data());
     std::memset(first.data(), 'a', size);
     std::memset(second.data(), 'b', size);
@@ -108,7 +108,7 @@ TEST_F(Links, TheFirstBrowserCommandThatRunsGetsTheLinkAndNoShellReadsIt) {
            {"R 100%% %s", {"100%", "L"}}, {"no-such-browser %s::R", {"L"}}}) {
     std::filesystem::remove(recorder + ".out");
     ScopedEnv env("BROWSER", Substitute(browser, "R", recorder));
-    ASSERT_TRUE(shell::OpenLink(std::wstring(link.begin(), link.end())));
+    ASSERT_TRUE(platform::OpenLink(std::wstring(link.begin(), link.end())));
     Argv wanted;
     for (const std::string& arg : expected) wanted.push_back(Substitute(arg, "L", link));
     EXPECT_EQ(RecordedArgs(recorder), wanted) << browser;
@@ -135,10 +135,10 @@ TEST_F(Links, OnlyWebLinksGoToXdgOpenWhichIsReapedAndNoHandlerIsAFailure) {
   const std::string opener = Recorder("xdg-open");
   for (const wchar_t* link : {L"file:///etc/passwd", L"javascript:alert(1)", L"ftp://h/x", L"", L"http://",
                               L"-http://h", L"httpx://h", L"http://h/\na", L"http://h/\x7F"}) {
-    EXPECT_FALSE(shell::OpenLink(link)) << link;
+    EXPECT_FALSE(platform::OpenLink(link)) << link;
   }
   EXPECT_FALSE(std::filesystem::exists(opener + ".out"));
-  ASSERT_TRUE(shell::OpenLink(L"HTTPS://www.orbishare.com/\u00E4"));
+  ASSERT_TRUE(platform::OpenLink(L"HTTPS://www.orbishare.com/\u00E4"));
   EXPECT_EQ(RecordedArgs(opener), Argv{"HTTPS://www.orbishare.com/\xC3\xA4"});
   const auto deadline = std::chrono::steady_clock::now() + kPatience;
   while (ChildProcesses() > 0 && std::chrono::steady_clock::now() < deadline) {
@@ -147,7 +147,7 @@ TEST_F(Links, OnlyWebLinksGoToXdgOpenWhichIsReapedAndNoHandlerIsAFailure) {
   EXPECT_EQ(ChildProcesses(), 0) << "a zombie is left";
   std::filesystem::remove(opener);
   ScopedEnv none("BROWSER", std::string("no-such-browser:also-missing %s"));
-  EXPECT_FALSE(shell::OpenLink(L"http://www.orbishare.com/"));
+  EXPECT_FALSE(platform::OpenLink(L"http://www.orbishare.com/"));
 }
 
 // Lines from many threads stay whole; each is appended in UTF-8.
@@ -156,7 +156,7 @@ TEST(DebugOutput, LinesStayWholeFromManyThreads) {
   std::vector<std::thread> writers;
   for (int t = 0; t < 4; ++t) {
     writers.emplace_back([t] {
-      for (int i = 0; i < 200; ++i) debug_output::Write(std::to_wstring(t * 1000 + i) + std::wstring(300, L'\u00E4') + L"\n");
+      for (int i = 0; i < 200; ++i) platform::WriteDebugOutput(std::to_wstring(t * 1000 + i) + std::wstring(300, L'\u00E4') + L"\n");
     });
   }
   for (auto& w : writers) w.join();

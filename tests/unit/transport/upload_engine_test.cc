@@ -23,7 +23,7 @@ using Lines = std::vector<std::string>;
 constexpr std::uint32_t KiB = 1024, MiB = 1024 * KiB;
 constexpr std::size_t kHeaderSizeBelow = 1024;  // pieces this small are part headers
 
-std::filesystem::path Native(const std::wstring& name) { return std::filesystem::u8path(text::WideToUtf8(name)); }
+std::filesystem::path Native(const std::wstring& name) { return std::filesystem::u8path(platform::WideToUtf8(name)); }
 
 std::wstring MakeFile(const std::wstring& name, const std::string& bytes) {
   return std::ofstream(Native(name), std::ios::binary) << bytes, name;
@@ -58,26 +58,26 @@ struct FakeServer {
     return UploadEnvironment{[this] { return now; }, [this](std::uint32_t ms) { sleeps.push_back(ms), now += ms; },
                              [this](const UploadRequest&, UploadProgress*, std::unique_ptr<UploadConnection>* out) {
                                *out = std::make_unique<Connection>(*this);
-                               return win::kOk;
+                               return platform::kOk;
                              }};
   }
 
   class Connection : public UploadConnection {
    public:
     explicit Connection(FakeServer& server) : s_(server) {}
-    win::Status AddHeader(const std::string& line) override { return s_.headers.push_back(line), win::kOk; }
-    win::Status Start(std::uint32_t contentLength) override {
+    platform::Status AddHeader(const std::string& line) override { return s_.headers.push_back(line), platform::kOk; }
+    platform::Status Start(std::uint32_t contentLength) override {
       s_.started = true;
       s_.announced = contentLength;
       s_.onStart();
-      return win::kOk;
+      return platform::kOk;
     }
-    win::Status Write(std::string_view piece) override {
+    platform::Status Write(std::string_view piece) override {
       s_.writes.emplace_back(piece);
       s_.now += s_.writeMs(piece.size());
-      return win::kOk;
+      return platform::kOk;
     }
-    win::Status End() override { return s_.ended = true, win::kOk; }
+    platform::Status End() override { return s_.ended = true, platform::kOk; }
     bool QueryStatusCode(std::uint32_t* code) override { return *code = 200, true; }
     std::string ReadReply() override { return "<uploadTemplate/>"; }
 
@@ -103,7 +103,7 @@ std::string FilePart(const std::string& name, const std::string& file, const std
 
 class Upload : public TempFolderTest {
  protected:
-  win::Status Run() {
+  platform::Status Run() {
     UploadEnvironment environment = server.Environment();
     environment.pauseAfterChunkMs = pauseMs;
     return Uploader(&listener, &request, &result, std::move(environment)).Upload();
@@ -146,7 +146,7 @@ TEST_F(Upload, TheWorkedExampleIsByteExactAndItsLengthAnnounced) {
   EXPECT_EQ(measuring.ComputeContentLength(b, &total, &sizes), 310u);
   EXPECT_NE(measuring.MakeBoundary(), measuring.MakeBoundary());
   EXPECT_TRUE(std::regex_match(measuring.MakeBoundary(), std::regex("-{27}[0-9A-F]{12}")));
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(server.headers, Lines{"Content-Type: multipart/form-data; boundary=" + server.Boundary()});
   EXPECT_EQ(server.announced, 310u);
   EXPECT_EQ(server.Body(), WithBoundary(FieldPart("title", "Sunset") + FilePart("PIPfile", "C:\\p.xml",
@@ -185,7 +185,7 @@ TEST_F(Upload, BodiesOfEveryShapeAreWhatTheirLengthAnnounced) {
     request = UploadRequest();
     server = FakeServer();
     c.fill(request);
-    ASSERT_EQ(Run(), win::kOk);
+    ASSERT_EQ(Run(), platform::kOk);
     EXPECT_EQ(server.Body(), WithBoundary(c.body, server.Boundary()));
     EXPECT_EQ(server.Body().size(), server.announced);
   }
@@ -219,7 +219,7 @@ TEST_F(Upload, FastWritesGrowTheChunkToSixteenMebibytesAndSlowOnesHalveItToTheFl
   for (std::uint32_t chunk = 32 * KiB; chunk <= 16 * MiB; chunk *= 2) growing.push_back(chunk);
   growing.insert(growing.end(), {16 * MiB, 16 * MiB});
   AddSparseFile(growing);
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(ChunkSizes(), growing);
 
   const std::vector<std::size_t> halving = {32 * KiB, 64 * KiB, 128 * KiB, 64 * KiB, 32 * KiB,
@@ -228,7 +228,7 @@ TEST_F(Upload, FastWritesGrowTheChunkToSixteenMebibytesAndSlowOnesHalveItToTheFl
   request.ClearFiles();
   AddSparseFile(halving);
   ScriptWriteTimes({100, 100, 2000, 1251, 2000, 800, 1250, 500, 499});
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(ChunkSizes(), halving);
 }
 
@@ -240,7 +240,7 @@ TEST_F(Upload, ProgressComesWhenTheHalfSecondChangesAndItsSpeedIsKept) {
   ScriptWriteTimes({300, 300, 300});
   request.AddFile(L"f", MakeSparseFile(L"f", 224 * KiB).c_str());
   request.AddFile(L"g", MakeFile(L"g", "12").c_str());
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(listener.events, (Lines{
       "FileBegin f", "FileProgress f 0 229376 40 0 229378 40 5600", "FileProgress f 98304 229376 1 98304 229378 1 98304",
       "FileProgress f 229376 229376 0 229376 229378 0 114688", "FileProgress f 229376 229376 0 229376 229378 0 114688",
@@ -249,7 +249,7 @@ TEST_F(Upload, ProgressComesWhenTheHalfSecondChangesAndItsSpeedIsKept) {
   request.ClearFiles();
   request.AddFile(L"g", L"g");
   listener.events.clear();
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(listener.Only("FileProgress g").at(0), "FileProgress g 0 2 0 0 2 0 114688");
 }
 
@@ -287,7 +287,7 @@ TEST_F(Upload, AZeroSpeedGivesNoTimeLeftInsteadOfTrapping) {
   request.rateEstimate = 0;
   ScriptWriteTimes({2000});
   request.AddFile(L"f", MakeFile(L"f", std::string(KiB, 'x')).c_str());
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(listener.Only("FileProgress"), (Lines{"FileProgress f 0 1024 0 0 1024 0 0",
                                                   "FileProgress f 1024 1024 0 1024 1024 0 256",
                                                   "FileProgress f 1024 1024 0 1024 1024 0 256"}));
@@ -321,7 +321,7 @@ TEST_F(Upload, ACancelIsPolledAfterEveryChunkAndEndsTheBodyUnfinished) {
   listener.cancelAt = [](int) { return true; };
   listener.polls = 0;
   request.ClearFiles();
-  EXPECT_EQ(Run(), win::kOk) << "an upload without files cannot be cancelled";
+  EXPECT_EQ(Run(), platform::kOk) << "an upload without files cannot be cancelled";
   EXPECT_EQ(listener.polls, 0);
 }
 

@@ -66,13 +66,13 @@ struct Journal {
   std::vector<std::intptr_t> payloads;
   bool onOwner = true;
   std::thread::id owner = std::this_thread::get_id();
-  std::unique_ptr<ui::Window>* destroyOnFirst = nullptr;  // by its own handler
+  std::unique_ptr<platform::Window>* destroyOnFirst = nullptr;  // by its own handler
   std::function<void()> duringDispatch = [] {};            // run inside each handler
 };
 
 std::atomic<int> g_dropped{0};
 
-std::intptr_t Record(ui::Window& window, std::uint32_t, std::uintptr_t, std::intptr_t lparam) {
+std::intptr_t Record(platform::Window& window, std::uint32_t, std::uintptr_t, std::intptr_t lparam) {
   auto* journal = static_cast<Journal*>(window.UserData());
   journal->onOwner = journal->onOwner && std::this_thread::get_id() == journal->owner;
   journal->payloads.push_back(*reinterpret_cast<int*>(lparam));
@@ -82,7 +82,7 @@ std::intptr_t Record(ui::Window& window, std::uint32_t, std::uintptr_t, std::int
   return 0;
 }
 
-void PostNumber(ui::Window& window, int number) {
+void PostNumber(platform::Window& window, int number) {
   window.Post(kMessage, 0, reinterpret_cast<std::intptr_t>(new int(number)), [](std::intptr_t lparam) {
     delete reinterpret_cast<int*>(lparam);
     ++g_dropped;
@@ -93,11 +93,11 @@ class Windows : public ::testing::Test {
  protected:
   static void SetUpTestSuite() {
     StartPython();
-    ui::RegisterWindowClass(L"Test Window", &Record);
+    platform::RegisterWindowClass(L"Test Window", &Record);
   }
   void SetUp() override { g_dropped = 0; }
-  std::unique_ptr<ui::Window> MakeWindow(Journal& journal) {
-    auto window = ui::Window::Create(L"Test Window");
+  std::unique_ptr<platform::Window> MakeWindow(Journal& journal) {
+    auto window = platform::Window::Create(L"Test Window");
     window->SetUserData(&journal);
     return window;
   }
@@ -115,12 +115,12 @@ TEST_F(Windows, DestroyingAWindowDropsItsMessagesAndAHandlerMayDestroyItsOwn) {
   }
   goneWindow.reset();
   EXPECT_EQ(g_dropped, 3);
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 4u);
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), 4u);
   EXPECT_EQ((std::vector{kept.payloads, gone.payloads, self.payloads}),
             (std::vector<std::vector<std::intptr_t>>{{0, 1, 2}, {}, {10}}));
-  EXPECT_EQ((std::pair{selfWindow.get(), g_dropped.load()}), (std::pair{(ui::Window*)nullptr, 5}));
+  EXPECT_EQ((std::pair{selfWindow.get(), g_dropped.load()}), (std::pair{(platform::Window*)nullptr, 5}));
   std::thread([] {
-    auto window = ui::Window::Create(L"Test Window");
+    auto window = platform::Window::Create(L"Test Window");
     for (int i = 0; i < 4; ++i) PostNumber(*window, i);
   }).join();
   EXPECT_EQ(g_dropped, 9) << "a thread that never dispatches frees its messages with its windows";
@@ -134,7 +134,7 @@ TEST_F(Windows, AThrowingHandlerLosesOnlyItsMessageAndADestroyWaitsForTheDispatc
   auto window = MakeWindow(journal);
   journal.duringDispatch = [&] { if (journal.payloads.size() == 1) throw std::bad_alloc(); };
   for (int i = 0; i < 3; ++i) PostNumber(*window, i);
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 3u);
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), 3u);
   EXPECT_EQ(journal.payloads, (std::vector<std::intptr_t>{0, 1, 2}));
   std::promise<void> entered;
   std::atomic<bool> returned{false};
@@ -151,7 +151,7 @@ TEST_F(Windows, AThrowingHandlerLosesOnlyItsMessageAndADestroyWaitsForTheDispatc
     window.reset();
     EXPECT_TRUE(returned);
   });
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 1u);
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), 1u);
   destroyer.join();
   EXPECT_EQ(g_dropped, 1);
 }
@@ -230,7 +230,7 @@ TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPol
   ASSERT_TRUE(proxy->CreateHiddenWindow());
   RaiseEveryEvent(*proxy);
   EXPECT_TRUE(target.events.empty()) << "nothing runs before the owner dispatches";
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), kEveryEvent.size());
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), kEveryEvent.size());
   EXPECT_EQ(target.events, kEveryEvent);
   EXPECT_EQ(target.threads, std::vector(kEveryEvent.size(), std::this_thread::get_id()));
 
@@ -242,7 +242,7 @@ TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPol
   EXPECT_EQ(answers, (std::vector<bool>{false, true}));
   target.destroyOnCompletion = &proxy;
   RaiseEveryEvent(*proxy);
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), kEveryEvent.size() - 1);
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), kEveryEvent.size() - 1);
   EXPECT_EQ(proxy, nullptr) << "the completion handler may destroy the proxy it runs in";
   Lines filtered = kEveryEvent;
   filtered.erase(filtered.begin() + 4);
@@ -253,7 +253,7 @@ TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPol
   RaiseEveryEvent(destroyed);
   destroyed.DestroyWindow();  // leak checkers see the dropped commands freed
   RaiseEveryEvent(destroyed);  // without a window the events go nowhere
-  EXPECT_EQ((std::pair{ui::MessageQueue::DispatchPending(), untouched.events.size()}), (std::pair{0ul, 0ul}));
+  EXPECT_EQ((std::pair{platform::MessageQueue::DispatchPending(), untouched.events.size()}), (std::pair{0ul, 0ul}));
 }
 
 TEST_F(Windows, ProgressCarriesTheWholePercentOfAllFilesAndTheFilesTimeLeft) {
