@@ -13,6 +13,8 @@
 #include "platform/text.h"
 #include "platform/wide_format.h"
 
+namespace diag {
+
 namespace {
 
 constexpr wchar_t kSwitchKey[] = L"SOFTWARE\\Quillmark\\Lumivanta";
@@ -68,3 +70,5 @@ void TraceMessage(const wchar_t* format, ...) {
   va_end(args);
   platform::WriteDebugOutput(CurrentPrefix().append(text, length).append(L"\n"));
 }
+
+}  // namespace diag

@@ -7,6 +7,8 @@
 // and scan it for the secrets they used (tests/python/test_service.py).
 #pragma once
 
+namespace diag {
+
 // Reads the switch again and sets the prefix to "[name]". A key that cannot be
 // opened keeps the previous state; a missing or unreadable value turns the trace
 // off. A name of 30 or more characters keeps the previous prefix.
@@ -18,3 +20,5 @@ void TraceSetPrefix(const char* name);
 void TraceMessage(const wchar_t* format, ...);
 
 inline constexpr int kTraceTextLimit = 1023;
+
+}  // namespace diag

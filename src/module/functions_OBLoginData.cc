@@ -15,31 +15,31 @@ namespace {
 
 using namespace binding;
 
-using HandleMember = HINTERNET OBLoginData::*;
-using LinkGetter = std::wstring (OBLoginData::*)();
+using HandleMember = HINTERNET service::OBLoginData::*;
+using LinkGetter = std::wstring (service::OBLoginData::*)();
 using UrlBuffer = std::array<char, kMaxPath>;
 
 constexpr char kSessionType[] = "OBLoginData *";
 
-PointerKind<OBLoginData> Session(OnNull onNull = OnNull::kRefuse) {
-  return Pointer<OBLoginData>(Type(TypeId::OBLoginData), kSessionType, onNull);
+PointerKind<service::OBLoginData> Session(OnNull onNull = OnNull::kRefuse) {
+  return Pointer<service::OBLoginData>(Type(TypeId::OBLoginData), kSessionType, onNull);
 }
 
 PyObject* SetHandle(PyObject* args, const char* function, HandleMember member) {
   return Call(args, function, ReturnsNone{},
-              [member](OBLoginData* self, HINTERNET handle) { self->*member = handle; },
+              [member](service::OBLoginData* self, HINTERNET handle) { self->*member = handle; },
               Session(OnNull::kSkipCall), Reference<HINTERNET>(Type(TypeId::HINTERNET), "HINTERNET"));
 }
 
 // A new heap cell holding the handle, owned by the pointer object returned.
 PyObject* GetHandle(PyObject* args, const char* function, HandleMember member) {
   return Call(args, function, NewPointer(Type(TypeId::HINTERNET), POINTER_OWN),
-              [member](OBLoginData* self) { return new HINTERNET(self->*member); }, Session());
+              [member](service::OBLoginData* self) { return new HINTERNET(self->*member); }, Session());
 }
 
 // A link to a service page.
 PyObject* GetLink(PyObject* args, const char* function, LinkGetter getter) {
-  return Call(args, function, ReturnsUnicode{}, [getter](OBLoginData* self) { return (self->*getter)(); },
+  return Call(args, function, ReturnsUnicode{}, [getter](service::OBLoginData* self) { return (self->*getter)(); },
               Session());
 }
 
@@ -50,18 +50,18 @@ const ModuleFunction kOBLoginDataFunctions[] = {
      [](PyObject* args, const char* name) {
        return Call(args, name, NewPointer(Type(TypeId::OBLoginData), POINTER_OWN | POINTER_NOSHADOW),
                    [](const wchar_t* version, const wchar_t* versionType, const wchar_t* uuid) {
-                     return new OBLoginData(version, versionType, uuid);
+                     return new service::OBLoginData(version, versionType, uuid);
                    },
                    Unicode(), Unicode(), Unicode());
      }},
     {"delete_OBLoginData",  // 11
      [](PyObject* args, const char* name) {
-       return Delete<OBLoginData>(args, name, Type(TypeId::OBLoginData), kSessionType);
+       return Delete<service::OBLoginData>(args, name, Type(TypeId::OBLoginData), kSessionType);
      }},
     {"OBLoginData_LoginOrbishare",  // 12
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsUnsigned{},
-                   [](OBLoginData* self, const wchar_t* account, const wchar_t* password) {
+                   [](service::OBLoginData* self, const wchar_t* account, const wchar_t* password) {
                      return self->LoginOrbishare(account, password);
                    },
                    Session(), Unicode(), Unicode());
@@ -69,50 +69,50 @@ const ModuleFunction kOBLoginDataFunctions[] = {
     {"OBLoginData_LogoutOrbishare",  // 13
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsNone{},
-                   [](OBLoginData* self) { self->LogoutOrbishare(); }, Session());
+                   [](service::OBLoginData* self) { self->LogoutOrbishare(); }, Session());
      }},
     {"OBLoginData_InitOBServerURL",  // 14
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsNone{},
-                   [](OBLoginData* self) { self->InitOBServerURL(); }, Session());
+                   [](service::OBLoginData* self) { self->InitOBServerURL(); }, Session());
      }},
     {"OBLoginData_SetOBURLAsReg",  // 15
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsNone{},
-                   [](OBLoginData* self, const wchar_t* serverHost) { self->SetOBURLAsReg(serverHost); },
+                   [](service::OBLoginData* self, const wchar_t* serverHost) { self->SetOBURLAsReg(serverHost); },
                    Session(), Unicode());
      }},
     {"OBLoginData_GetUserName",  // 16
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsUnicode{},
-                   [](OBLoginData* self) { return self->GetUserName(); }, Session());
+                   [](service::OBLoginData* self) { return self->GetUserName(); }, Session());
      }},
     {"OBLoginData_GetServerUrl",  // 17
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsUnicode{},
-                   [](OBLoginData* self) { return self->GetServerUrl(); }, Session());
+                   [](service::OBLoginData* self) { return self->GetServerUrl(); }, Session());
      }},
     {"OBLoginData_GetLoginTokenID",  // 18
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsUnicode{},
-                   [](OBLoginData* self) { return self->GetLoginTokenID(); }, Session());
+                   [](service::OBLoginData* self) { return self->GetLoginTokenID(); }, Session());
      }},
     {"OBLoginData_GetSignUpURL",  // 19
      [](PyObject* args, const char* name) {
-       return GetLink(args, name, &OBLoginData::GetSignUpURL);
+       return GetLink(args, name, &service::OBLoginData::GetSignUpURL);
      }},
     {"OBLoginData_GetForgetPasswordURL",  // 20
      [](PyObject* args, const char* name) {
-       return GetLink(args, name, &OBLoginData::GetForgetPasswordURL);
+       return GetLink(args, name, &service::OBLoginData::GetForgetPasswordURL);
      }},
     {"OBLoginData_GetLensCorrectionURL",  // 21
      [](PyObject* args, const char* name) {
-       return GetLink(args, name, &OBLoginData::GetLensCorrectionURL);
+       return GetLink(args, name, &service::OBLoginData::GetLensCorrectionURL);
      }},
     {"OBLoginData_GetPresetCategory",  // 22
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsUnicodeDict{},
-                   [](OBLoginData* self, const wchar_t* language) -> const OBLoginData::Categories& {
+                   [](service::OBLoginData* self, const wchar_t* language) -> const service::OBLoginData::Categories& {
                      return self->GetPresetCategory(language);
                    },
                    Session(), Unicode());
@@ -121,71 +121,71 @@ const ModuleFunction kOBLoginDataFunctions[] = {
     {"OBLoginData_GetCategroyName",  // 23
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsInt{},
-                   [](OBLoginData* self, int id, CString& name) { return self->GetCategroyName(id, name); },
+                   [](service::OBLoginData* self, int id, CString& name) { return self->GetCategroyName(id, name); },
                    Session(), Integer("int"), Reference<CString>(Type(TypeId::CString), "CString &"));
      }},
     {"OBLoginData_GetCategoryCount",  // 24
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsInt{},
-                   [](OBLoginData* self) { return self->GetCategoryCount(); }, Session());
+                   [](service::OBLoginData* self) { return self->GetCategoryCount(); }, Session());
      }},
     {"OBLoginData_SetRelateVideo",  // 25
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsUnicodeOrNone{},
-                   [](OBLoginData* self, const wchar_t* videoURL, const wchar_t* website, const wchar_t* videoInfo) {
+                   [](service::OBLoginData* self, const wchar_t* videoURL, const wchar_t* website, const wchar_t* videoInfo) {
                      return self->SetRelateVideo(videoURL, website, videoInfo);
                    },
                    Session(), Unicode(), Unicode(), Unicode());
      }},
     {"OBLoginData_GetPresetDownloadURL",  // 26
      [](PyObject* args, const char* name) {
-       return GetLink(args, name, &OBLoginData::GetPresetDownloadURL);
+       return GetLink(args, name, &service::OBLoginData::GetPresetDownloadURL);
      }},
     {"OBLoginData_GetEffectByGUID",  // 27
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsUnicodeOrNone{},
-                   [](OBLoginData* self, const wchar_t* guid) { return self->GetEffectByGUID(guid); }, Session(),
+                   [](service::OBLoginData* self, const wchar_t* guid) { return self->GetEffectByGUID(guid); }, Session(),
                    Unicode());
      }},
     {"OBLoginData_m_hInternet_set",  // 28
      [](PyObject* args, const char* name) {
-       return SetHandle(args, name, &OBLoginData::m_hInternet);
+       return SetHandle(args, name, &service::OBLoginData::m_hInternet);
      }},
     {"OBLoginData_m_hInternet_get",  // 29
      [](PyObject* args, const char* name) {
-       return GetHandle(args, name, &OBLoginData::m_hInternet);
+       return GetHandle(args, name, &service::OBLoginData::m_hInternet);
      }},
     {"OBLoginData_m_hConnect_set",  // 30
      [](PyObject* args, const char* name) {
-       return SetHandle(args, name, &OBLoginData::m_hConnect);
+       return SetHandle(args, name, &service::OBLoginData::m_hConnect);
      }},
     {"OBLoginData_m_hConnect_get",  // 31
      [](PyObject* args, const char* name) {
-       return GetHandle(args, name, &OBLoginData::m_hConnect);
+       return GetHandle(args, name, &service::OBLoginData::m_hConnect);
      }},
     {"OBLoginData_m_hRequest_set",  // 32
      [](PyObject* args, const char* name) {
-       return SetHandle(args, name, &OBLoginData::m_hRequest);
+       return SetHandle(args, name, &service::OBLoginData::m_hRequest);
      }},
     {"OBLoginData_m_hRequest_get",  // 33
      [](PyObject* args, const char* name) {
-       return GetHandle(args, name, &OBLoginData::m_hRequest);
+       return GetHandle(args, name, &service::OBLoginData::m_hRequest);
      }},
     {"OBLoginData_m_bServerReachable_set",  // 34
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsNone{},
-                   [](OBLoginData* self, int reachable) { self->m_bServerReachable = reachable; },
+                   [](service::OBLoginData* self, int reachable) { self->m_bServerReachable = reachable; },
                    Session(OnNull::kSkipCall), Integer("BOOL"));
      }},
     {"OBLoginData_m_bServerReachable_get",  // 35
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsInt{},
-                   [](OBLoginData* self) { return self->m_bServerReachable; }, Session());
+                   [](service::OBLoginData* self) { return self->m_bServerReachable; }, Session());
      }},
     {"OBLoginData_m_szChkServerUrl_set",  // 36
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsNone{},
-                   [](OBLoginData* self, const UrlBuffer& url) {
+                   [](service::OBLoginData* self, const UrlBuffer& url) {
                      std::copy(url.begin(), url.end(), self->m_szChkServerUrl);
                    },
                    Session(), NarrowArray<kMaxPath>("char [_MAX_PATH]"));
@@ -194,7 +194,7 @@ const ModuleFunction kOBLoginDataFunctions[] = {
     {"OBLoginData_m_szChkServerUrl_get",  // 37
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsStr{},
-                   [](OBLoginData* self) { return std::string_view(self->m_szChkServerUrl, kMaxPath); },
+                   [](service::OBLoginData* self) { return std::string_view(self->m_szChkServerUrl, kMaxPath); },
                    Session());
      }},
     {"OBLoginData_swigregister",  // 38

@@ -22,8 +22,8 @@ extern "C" __attribute__((visibility("default"))) void init_PyUploader() {
   // blocking waits.
   platform::http::GlobalInit();
   PyEval_InitThreads();
-  InstallBlockingRelease(
-      {&AllowThreadsGuard::ReleaseInterpreterLock, &AllowThreadsGuard::RetakeInterpreterLock});
+  platform::InstallBlockingRelease(
+      {&interpreter::AllowThreadsGuard::ReleaseInterpreterLock, &interpreter::AllowThreadsGuard::RetakeInterpreterLock});
 
   PyObject* module =
       Py_InitModule4(kModuleName, module::FunctionTable(), nullptr, nullptr, kApiVersion);

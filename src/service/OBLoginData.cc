@@ -5,6 +5,8 @@
 #include "diag/trace.h"
 #include "platform/text.h"
 
+namespace service {
+
 namespace {
 
 constexpr char kTraceName[] = "OBLoginData";
@@ -25,10 +27,10 @@ OBLoginData::OBLoginData(const wchar_t* version, const wchar_t* versionType, con
       m_hosts(ServiceHosts::FromEnvironment()) {
   m_strSignUpURL = DefaultLink(kSignUpPath);
   m_strForgetPasswordURL = DefaultLink(kForgetPasswordPath);
-  TraceSetPrefix(kTraceName);
+  diag::TraceSetPrefix(kTraceName);
   std::memset(m_szChkServerUrl, 0, sizeof m_szChkServerUrl);
-  TraceMessage(L"KRV version = %s", m_strVersion.c_str());
-  TraceMessage(L"KRV versionType = %s", m_strVersionType.c_str());
+  diag::TraceMessage(L"KRV version = %s", m_strVersion.c_str());
+  diag::TraceMessage(L"KRV versionType = %s", m_strVersionType.c_str());
 }
 
 OBLoginData::~OBLoginData() { m_runningOperations.Close(); }
@@ -58,3 +60,5 @@ void OBLoginData::SetProfileURL(const std::wstring& link) { m_strProfileURL = li
 std::wstring OBLoginData::DefaultLink(const wchar_t* path) const {
   return L"http://" + m_hosts.defaultHost + path;
 }
+
+}  // namespace service

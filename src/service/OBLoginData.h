@@ -21,6 +21,8 @@ namespace platform::xml {
 class Document;
 }
 
+namespace service {
+
 class OBLoginData {
  public:
   // Null arguments are taken as empty texts.
@@ -109,5 +111,7 @@ class OBLoginData {
   const ServiceHosts m_hosts;
   // Passed by the operations that open a BlockingScope, during which another
   // Python thread may delete the session.
-  OperationGate m_runningOperations;
+  platform::OperationGate m_runningOperations;
 };
+
+}  // namespace service

@@ -4,6 +4,8 @@
 
 #include "platform/text.h"
 
+namespace service {
+
 namespace {
 
 std::wstring Setting(const char* variable, const wchar_t* fallback) {
@@ -17,3 +19,5 @@ ServiceHosts ServiceHosts::FromEnvironment() {
   return ServiceHosts{Setting(kDefaultHostVariable, kDefaultHost), Setting(kStagingHostVariable, kStagingHost),
                       Setting(kDetectionHostVariable, kDetectionHost)};
 }
+
+}  // namespace service

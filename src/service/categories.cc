@@ -10,6 +10,8 @@
 #include "service/reply_walk.h"
 #include "service/server_request.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kCategoryServlet[] = L"/servlet/getPresetCategory";
@@ -29,7 +31,7 @@ void AddCategories(const platform::xml::Document& reply, OBLoginData::Categories
       const std::wstring id = category.Attribute(kCategoryIdAttribute);
       if (id.empty()) continue;
       if (taken == kMostCategoriesPerReply) {
-        TraceMessage(L"GetPresetCategory: only the first %d categories of the reply are kept.",
+        diag::TraceMessage(L"GetPresetCategory: only the first %d categories of the reply are kept.",
                      kMostCategoriesPerReply);
         return;
       }
@@ -58,3 +60,5 @@ int OBLoginData::GetCategroyName(int id, std::wstring& name) const {
   name = found->second;
   return 1;
 }
+
+}  // namespace service

@@ -11,6 +11,8 @@
 #include "service/OBLoginData.h"
 #include "service/exchange.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kDetectionPage[] = L"observer.jsp";
@@ -41,9 +43,9 @@ bool IsBareHostName(std::wstring_view value) {
 
 void OBLoginData::InitOBServerURL() {
   // Ends last: after every use of the session, with the lock taken back.
-  const OperationGate::Pass running(m_runningOperations);
+  const platform::OperationGate::Pass running(m_runningOperations);
   if (!running) return;
-  const BlockingScope blocking;
+  const platform::BlockingScope blocking;
   EnsureServerUrl();
 }
 
@@ -54,10 +56,10 @@ void OBLoginData::SetOBURLAsReg(const wchar_t* serverHost) {
 void OBLoginData::EnsureServerUrl() {
   if (!m_strServerUrl.empty()) return;
   DetectServerInfo();
-  TraceMessage(L"Get OB server URL from server. URL = %s", m_strServerUrl.c_str());
+  diag::TraceMessage(L"Get OB server URL from server. URL = %s", m_strServerUrl.c_str());
   if (m_strServerUrl.empty()) {
     m_strServerUrl = m_hosts.stagingHost;
-    TraceMessage(L"Use static URL as OB server URL.");
+    diag::TraceMessage(L"Use static URL as OB server URL.");
   }
 }
 
@@ -93,13 +95,15 @@ void OBLoginData::StoreServiceInfo(const platform::xml::Document& reply) {
   };
   for (const InfoField& field : fields) {
     const platform::xml::Lookup node = reply.NodeText(field.path);
-    if (node.failed() && field.failedLine) TraceMessage(field.failedLine);
+    if (node.failed() && field.failedLine) diag::TraceMessage(field.failedLine);
     if (!node.found()) continue;
     if (field.acceptable && !field.acceptable(node.text)) {
-      TraceMessage(field.refusedLine, node.text.c_str());
+      diag::TraceMessage(field.refusedLine, node.text.c_str());
       continue;
     }
     this->*field.member = node.text;
-    if (field.storedLine) TraceMessage(field.storedLine, (this->*field.member).c_str());
+    if (field.storedLine) diag::TraceMessage(field.storedLine, (this->*field.member).c_str());
   }
 }
+
+}  // namespace service

@@ -9,6 +9,8 @@
 #include "service/server_request.h"
 #include "service/unescape_url.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kEffectServlet[] = L"/servlet/GetEffectByGUIDForQZM";
@@ -38,3 +40,5 @@ std::optional<std::wstring> OBLoginData::GetEffectByGUID(const wchar_t* guid) {
   }
   return UnescapeUrl(address);
 }
+
+}  // namespace service

@@ -3,6 +3,8 @@
 #include "platform/text.h"
 #include "service/percent_encoding.h"
 
+namespace service {
+
 namespace {
 
 constexpr unsigned char kFirstPrintable = 0x20;
@@ -20,3 +22,5 @@ bool IsUnsafe(unsigned char byte) {
 std::wstring EscapeFormValue(std::wstring_view text) {
   return PercentEncode(platform::WideToUtf8(text), IsUnsafe, platform::kLowerHexDigits);
 }
+
+}  // namespace service

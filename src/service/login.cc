@@ -12,6 +12,8 @@
 #include "service/escape_form_value.h"
 #include "service/exchange.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kSignInPath[] = L"/servlet/memLogin";
@@ -40,18 +42,18 @@ struct ReplyField {
 
 unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* password) {
   if (IsEmpty(account) || IsEmpty(password)) {
-    TraceMessage(L"Login OB fail: Empty user name or password");
+    diag::TraceMessage(L"Login OB fail: Empty user name or password");
     m_bLoggedIn = 0;
     return 0;
   }
   // Ends last: after every use of the session, with the lock taken back.
-  const OperationGate::Pass running(m_runningOperations);
+  const platform::OperationGate::Pass running(m_runningOperations);
   if (!running) return 0;
-  const BlockingScope blocking;
+  const platform::BlockingScope blocking;
   EnsureServerUrl();
   const std::string probeUrl = "http://" + platform::WideToUtf8(m_hosts.defaultHost);
   if (!CheckServerReachable(probeUrl.c_str())) {
-    TraceMessage(L"Login OB fail: Can not reach the OB server");
+    diag::TraceMessage(L"Login OB fail: Can not reach the OB server");
     return 0;
   }
 
@@ -87,12 +89,12 @@ unsigned int OBLoginData::ReadSignInReply(const platform::xml::Document& reply, 
 
   unsigned int result = 0;
   const platform::xml::Lookup tokenNode = reply.NodeText("info/tokenid");
-  if (tokenNode.failed()) TraceMessage(L"Login OB fail: Can not parse tokenid from xml.");
+  if (tokenNode.failed()) diag::TraceMessage(L"Login OB fail: Can not parse tokenid from xml.");
   if (tokenNode.found()) {
     token = tokenNode.text;
     result = 1;
   } else {
-    TraceMessage(L"No tokenID, login failed!!");
+    diag::TraceMessage(L"No tokenID, login failed!!");
   }
 
   const ReplyField fields[] = {
@@ -109,7 +111,7 @@ unsigned int OBLoginData::ReadSignInReply(const platform::xml::Document& reply, 
   for (const ReplyField& field : fields) {
     const platform::xml::Lookup node = reply.NodeText(field.path);
     if (node.failed()) {
-      TraceMessage(field.failedLine);
+      diag::TraceMessage(field.failedLine);
       result = 0;
     }
     if (node.found() && field.store) field.store(*this, node.text);
@@ -130,3 +132,5 @@ void OBLoginData::LogoutOrbishare() {
   m_strLensCorrectionURL.clear();
   m_strVideoGalleryURL.clear();
 }
+
+}  // namespace service

@@ -7,6 +7,8 @@
 
 #include "platform/ascii.h"
 
+namespace service {
+
 // The bytes as wide text, each byte for which `mustEscape` holds written as "%"
 // and two hex digits taken from `digits`.
 template <typename Predicate>
@@ -25,3 +27,5 @@ std::wstring PercentEncode(std::string_view bytes, Predicate mustEscape, const c
   }
   return encoded;
 }
+
+}  // namespace service

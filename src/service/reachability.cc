@@ -10,6 +10,8 @@
 #include "platform/http_probe.h"
 #include "service/OBLoginData.h"
 
+namespace service {
+
 namespace {
 
 constexpr char kProbeAgent[] = "Microsoft Internet Explorer";
@@ -77,3 +79,5 @@ void OBLoginData::ProbeThreadProc(platform::http::Probe& probe) {
   }
   CloseHandle(m_hInternet, probe.session());
 }
+
+}  // namespace service

@@ -10,6 +10,8 @@
 #include "service/OBLoginData.h"
 #include "service/server_request.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kRelateVideoServlet[] = L"/servlet/setRelateVideo";
@@ -31,18 +33,18 @@ std::optional<std::wstring> ReplyField(std::optional<std::string> reply, const c
 std::optional<std::wstring> OBLoginData::SetRelateVideo(const wchar_t* videoURL, const wchar_t* website,
                                                         const wchar_t* videoInfo) {
   if (!videoURL || !website || !videoInfo) {
-    TraceMessage(L"SetRelateVideo wszVideoURL|wszWebsite|wszVideoInfo fail");
+    diag::TraceMessage(L"SetRelateVideo wszVideoURL|wszWebsite|wszVideoInfo fail");
     return std::nullopt;
   }
   const std::wstring token = GetToken();
   if (token.empty()) {
-    TraceMessage(L"SetRelateVideo GetTokenID fail");
+    diag::TraceMessage(L"SetRelateVideo GetTokenID fail");
     return std::nullopt;
   }
   std::wstring videoID;
   GetVideoID(videoID);
   if (videoID.empty()) {
-    TraceMessage(L"SetRelateVideo GetVideoID fail");
+    diag::TraceMessage(L"SetRelateVideo GetVideoID fail");
     return std::nullopt;
   }
   EnsureServerUrl();
@@ -75,3 +77,5 @@ void OBLoginData::GetVideoID(std::wstring& videoID) {
     videoID = std::move(*id);
   }
 }
+
+}  // namespace service

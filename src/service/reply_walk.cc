@@ -2,6 +2,8 @@
 
 #include "platform/ascii.h"
 
+namespace service {
+
 std::vector<platform::xml::Node> ChildrenNamed(const platform::xml::Node& parent, std::wstring_view name) {
   std::vector<platform::xml::Node> matches;
   for (const platform::xml::Node& child : parent.Children()) {
@@ -9,3 +11,5 @@ std::vector<platform::xml::Node> ChildrenNamed(const platform::xml::Node& parent
   }
   return matches;
 }
+
+}  // namespace service

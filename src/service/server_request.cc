@@ -1,5 +1,7 @@
 #include "service/server_request.h"
 
+namespace service {
+
 std::wstring QueryPath(std::wstring_view servlet, std::initializer_list<QueryField> fields) {
   std::wstring path(servlet);
   wchar_t separator = L'?';
@@ -23,3 +25,5 @@ std::optional<std::string> PostToServer(const std::wstring& host, const std::wst
   return coding == ReplyCoding::kUtf8 ? service::DecodeUtf8Reply(std::move(*reply))
                                       : service::DecodeAnsiReply(std::move(*reply));
 }
+
+}  // namespace service

@@ -4,6 +4,8 @@
 
 #include "platform/ascii.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kEscape = L'%';
@@ -38,3 +40,5 @@ std::wstring UnescapeUrl(std::wstring_view text) {
   }
   return result;
 }
+
+}  // namespace service

@@ -1,5 +1,7 @@
 #include "transport/ChunkPause.h"
 
+namespace transport {
+
 // Digits only: no sign, no spaces, no other base, and no overflow on the way.
 std::optional<std::uint32_t> ChunkPause::Parse(const char* text) {
   if (*text == '\0') return std::nullopt;
@@ -11,3 +13,5 @@ std::optional<std::uint32_t> ChunkPause::Parse(const char* text) {
   }
   return ms;
 }
+
+}  // namespace transport

@@ -5,6 +5,8 @@
 #include "transport/UploadRequest.h"
 #include "transport/UploadStatus.h"
 
+namespace transport {
+
 namespace {
 
 // A call abandoned at the listener's request ends the upload as cancelled.
@@ -81,3 +83,5 @@ void HttpUploadConnection::OnResponseReceived(std::uint32_t bytes) {
 void HttpUploadConnection::OnClosingConnection() { listener_->OnClosingConnection(); }
 void HttpUploadConnection::OnConnectionClosed() { listener_->OnConnectionClosed(); }
 bool HttpUploadConnection::IsCancelled() { return listener_->IsCancelled(); }
+
+}  // namespace transport

@@ -9,6 +9,8 @@
 #include "transport/UploadConnection.h"
 #include "transport/UploadEnvironment.h"
 
+namespace transport {
+
 class HttpUploadConnection : public UploadConnection, private platform::http::ConnectionEvents {
  public:
   static constexpr const char* kAgent = "WinInetPost/0.0.4";
@@ -45,3 +47,5 @@ class HttpUploadConnection : public UploadConnection, private platform::http::Co
   platform::http::Connection connection_;
   platform::http::Request request_;
 };
+
+}  // namespace transport

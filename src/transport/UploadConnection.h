@@ -8,6 +8,8 @@
 
 #include "platform/win_error.h"
 
+namespace transport {
+
 class UploadConnection {
  public:
   virtual ~UploadConnection() = default;
@@ -24,3 +26,5 @@ class UploadConnection {
   // The reply body, as much of it as could be read.
   virtual std::string ReadReply() = 0;
 };
+
+}  // namespace transport

@@ -10,6 +10,8 @@
 #include "transport/ChunkPause.h"
 #include "transport/UploadConnection.h"
 
+namespace transport {
+
 class UploadProgress;
 class UploadRequest;
 
@@ -27,3 +29,5 @@ struct UploadEnvironment {
   // The steady clock, a real sleep, HTTP on port 80 and the default pause.
   static UploadEnvironment Platform();
 };
+
+}  // namespace transport

@@ -3,6 +3,8 @@
 #include "platform/text.h"
 #include "platform/url.h"
 
+namespace transport {
+
 namespace {
 
 constexpr const char* kScheme = "http";
@@ -34,3 +36,5 @@ void UploadRequest::AddFile(const wchar_t* name, const wchar_t* path) {
 void UploadRequest::ClearFields() { fields.clear(); }
 
 void UploadRequest::ClearFiles() { files.clear(); }
+
+}  // namespace transport

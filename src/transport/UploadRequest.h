@@ -9,6 +9,8 @@
 
 #include "transport/UploadFile.h"
 
+namespace transport {
+
 class UploadRequest {
  public:
   // Bytes per half-second assumed before anything has been measured.
@@ -31,3 +33,5 @@ class UploadRequest {
   std::map<std::string, std::string> fields;
   std::uint32_t rateEstimate = kInitialRateEstimate;
 };
+
+}  // namespace transport

@@ -9,6 +9,8 @@
 #include "transport/UploadResult.h"
 #include "transport/UploadStatus.h"
 
+namespace transport {
+
 namespace {
 
 // Lengths on the wire are 32-bit: a body or file of 4 GiB or more cannot be sent.
@@ -214,3 +216,5 @@ char* Uploader::ChunkBuffer() {
 }
 
 std::uint32_t Uploader::CurrentTick() const { return environment_.tickCount() / kMsPerTick; }
+
+}  // namespace transport

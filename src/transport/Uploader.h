@@ -19,6 +19,9 @@
 namespace platform {
 class File;
 }
+
+namespace transport {
+
 class UploadProgress;
 class UploadRequest;
 struct UploadResult;
@@ -83,3 +86,5 @@ class Uploader {
   ChunkLog chunkLog_;
   std::optional<platform::LargeBuffer> chunkBuffer_;  // kChunkCeiling bytes, made at the first file
 };
+
+}  // namespace transport

@@ -8,6 +8,8 @@
 #include "transport/UploadRequest.h"
 #include "transport/Uploader.h"
 
+namespace transport {
+
 namespace {
 
 constexpr const char* kCrlf = "\r\n";
@@ -108,3 +110,5 @@ std::uint64_t Uploader::ComputeContentLength(const std::string& boundary,
   }
   return length + MakeClosingDelimiter(boundary).size();
 }
+
+}  // namespace transport

@@ -7,6 +7,8 @@
 
 #include "platform/message_queue.h"
 
+namespace upload {
+
 namespace {
 
 // The interpreter's pending-call queue is small and only tried, never waited
@@ -28,3 +30,5 @@ void ScheduleDrain() {
 }  // namespace
 
 void InstallPendingCallPump() { platform::MessageQueue::ForCurrentThread()->SetWakeHandler(&ScheduleDrain); }
+
+}  // namespace upload

@@ -4,6 +4,8 @@
 
 #include "upload/PendingCallPump.h"
 
+namespace upload {
+
 PyCallbackWnd::PyCallbackWnd(const wchar_t* className) {
   const std::wstring name = className ? className : kDefaultClassName;
   platform::RegisterWindowClass(name, &CallbackWindowProc);  // a class made by an earlier object is reused
@@ -30,3 +32,5 @@ std::intptr_t PyCallbackWnd::CallbackWindowProc(platform::Window& window, std::u
   if (self != nullptr && self->liveMark == kLiveMark) return self->WindowProc(message, wparam, lparam);
   return platform::DefaultWindowProcedure(window, message, wparam, lparam);
 }
+
+}  // namespace upload

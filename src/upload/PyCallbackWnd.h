@@ -6,6 +6,8 @@
 #include "platform/window.h"
 #include "upload/PyCallback.h"
 
+namespace upload {
+
 // A PyCallback with a hidden window owned by the constructing thread, whose
 // messages reach the virtual WindowProc.
 class PyCallbackWnd : public PyCallback {
@@ -28,3 +30,5 @@ class PyCallbackWnd : public PyCallback {
   std::uint32_t liveMark = kLiveMark;
   std::unique_ptr<platform::Window> hwnd;
 };
+
+}  // namespace upload

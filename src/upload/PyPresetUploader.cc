@@ -15,6 +15,8 @@
 #include "service/unescape_url.h"
 #include "transport/ChunkPause.h"
 
+namespace upload {
+
 namespace {
 
 constexpr char kTraceName[] = "PyPresetUploader";
@@ -55,15 +57,15 @@ int Percentage(std::uint32_t sent, std::uint32_t total) {
 // decimal digits up to ChunkPause::kLongestMs: the default, and one trace line
 // naming the refused value.
 std::uint32_t ChunkPauseFromEnvironment() {
-  const char* value = std::getenv(ChunkPause::kVariable);
-  if (value == nullptr) return ChunkPause::kDefaultMs;
-  if (const auto pause = ChunkPause::Parse(value)) return *pause;
+  const char* value = std::getenv(transport::ChunkPause::kVariable);
+  if (value == nullptr) return transport::ChunkPause::kDefaultMs;
+  if (const auto pause = transport::ChunkPause::Parse(value)) return *pause;
   // Wide first: a value that is not UTF-8 still shows, with replacement characters.
   const std::wstring shown = platform::Utf8ToWide(value);
-  TraceMessage(L"%S refused: \"%s\" is not a whole number of milliseconds from 0 to %u;"
+  diag::TraceMessage(L"%S refused: \"%s\" is not a whole number of milliseconds from 0 to %u;"
                L" the pause stays %u ms",
-               ChunkPause::kVariable, shown.c_str(), ChunkPause::kLongestMs, ChunkPause::kDefaultMs);
-  return ChunkPause::kDefaultMs;
+               transport::ChunkPause::kVariable, shown.c_str(), transport::ChunkPause::kLongestMs, transport::ChunkPause::kDefaultMs);
+  return transport::ChunkPause::kDefaultMs;
 }
 
 }  // namespace
@@ -76,7 +78,7 @@ PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* tok
       uuid(Narrow(uuid)),
       version(Narrow(version)),
       versionType(Narrow(versionType)) {
-  TraceSetPrefix(kTraceName);
+  diag::TraceSetPrefix(kTraceName);
   // After the prefix: a refused setting is traced behind this object's name.
   chunkPauseMs = ChunkPauseFromEnvironment();
 }
@@ -84,7 +86,7 @@ PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* tok
 PyPresetUploader::~PyPresetUploader() {
   reports.Close();
   cancelRequested = true;
-  AllowThreadsGuard unlocked;  // neither the join nor the window's end needs Python
+  interpreter::AllowThreadsGuard unlocked;  // neither the join nor the window's end needs Python
   JoinWorker();
   DestroyProxyWindow();
 }
@@ -106,7 +108,7 @@ int PyPresetUploader::StartUpload(
   cancelRequested = false;
   uploadedUrl.clear();
   // An upload that ends before any status arrives must not report an earlier one's.
-  uploadResult = UploadResult{};
+  uploadResult = transport::UploadResult{};
   uploadRequest.ClearFields();
   uploadRequest.ClearFiles();
   AddTextFields(Texts{templateKey, title, category, tags, description});
@@ -117,7 +119,7 @@ int PyPresetUploader::StartUpload(
 // The reports of a window reach Python only on the interpreter's main thread,
 // and the form must not change under a running worker.
 bool PyPresetUploader::CanStartUpload(const wchar_t* presetFile, const Images& images) const {
-  if (uploadThread || !OnInterpreterMainThread()) return false;
+  if (uploadThread || !interpreter::OnInterpreterMainThread()) return false;
   if (!FileGiven(presetFile)) return false;
   for (std::size_t i = 0; i < kRequiredImages; ++i) {
     if (!FileGiven(images[i])) return false;
@@ -181,7 +183,7 @@ bool PyPresetUploader::StartWorker() {
 std::string PyPresetUploader::JoinWorker() {
   if (!uploadThread) return {};
   {
-    AllowThreadsGuard unlocked;
+    interpreter::AllowThreadsGuard unlocked;
     uploadThread->Join();
   }
   std::string reply = uploadThread->GetReply();
@@ -198,7 +200,7 @@ void PyPresetUploader::DestroyProxyWindow() {
 void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32_t,
                                       std::uint32_t fileTimeLeft, std::uint32_t allSent,
                                       std::uint32_t allSize, std::uint32_t, std::uint32_t) {
-  const OperationGate::Pass report(reports);
+  const platform::OperationGate::Pass report(reports);
   if (!report) return;
   Call(kProgressFormat, kReportKind, kProgressEvent, Percentage(allSent, allSize),
        static_cast<int>(fileTimeLeft));
@@ -207,9 +209,9 @@ void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32
 // Runs inside the proxy window's own command handler; the callable, called
 // last, may even destroy this object.
 void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
-  const OperationGate::Pass report(reports);
+  const platform::OperationGate::Pass report(reports);
   if (!report) return;
-  TraceMessage(L"PyPresetUploader::OnBackgroundUploadComplete");
+  diag::TraceMessage(L"PyPresetUploader::OnBackgroundUploadComplete");
   uploadedUrl.clear();
   const std::string reply = JoinWorker();
   const std::wstring errorText = reply.empty() ? std::wstring() : ReadReply(reply);
@@ -223,9 +225,9 @@ void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
 std::wstring PyPresetUploader::ReadReply(const std::string& reply) {
   const platform::xml::Document document(platform::ValidUtf8(reply));
   const platform::xml::Lookup url = document.NodeText(kUrlNode);
-  if (url.found()) uploadedUrl = UnescapeUrl(url.text);
+  if (url.found()) uploadedUrl = service::UnescapeUrl(url.text);
   const platform::xml::Lookup error = document.NodeText(kErrorNode);
-  if (error.failed()) TraceMessage(L"Upload OB fail: Can not parse errMsg from xml.");
+  if (error.failed()) diag::TraceMessage(L"Upload OB fail: Can not parse errMsg from xml.");
   return error.found() ? error.text : std::wstring();
 }
 
@@ -237,3 +239,5 @@ bool PyPresetUploader::Succeeded() const {
 PyObject* PyPresetUploader::GetUploadedFileUrl() const {
   return Py_BuildValue("u", uploadedUrl.c_str());
 }
+
+}  // namespace upload

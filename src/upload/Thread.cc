@@ -2,6 +2,8 @@
 
 #include <system_error>
 
+namespace upload {
+
 Thread::~Thread() {
   if (handle.joinable()) handle.join();
 }
@@ -47,3 +49,5 @@ void Thread::WaitAtStartGate() {
   std::unique_lock<std::mutex> lock(startGate.mutex);
   startGate.opened.wait(lock, [this] { return startGate.open; });
 }
+
+}  // namespace upload

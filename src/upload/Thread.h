@@ -6,6 +6,8 @@
 #include <mutex>
 #include <thread>
 
+namespace upload {
+
 class Thread {
  public:
   Thread() = default;
@@ -49,3 +51,5 @@ class Thread {
   StartGate startGate;
   std::uint32_t exitCode = 0;  // written by the thread, read after the join
 };
+
+}  // namespace upload

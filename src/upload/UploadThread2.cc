@@ -7,8 +7,10 @@
 #include "transport/UploadResult.h"
 #include "transport/Uploader.h"
 
-UploadThread2::UploadThread2(UploadRequest* request, UploadResult* result,
-                             BackgroundUploadProgress* listener, std::uint32_t chunkPauseMs)
+namespace upload {
+
+UploadThread2::UploadThread2(transport::UploadRequest* request, transport::UploadResult* result,
+                             transport::BackgroundUploadProgress* listener, std::uint32_t chunkPauseMs)
     : request(request), result(result), listener(listener), chunkPauseMs(chunkPauseMs) {}
 
 std::uint32_t UploadThread2::Run() {
@@ -22,9 +24,9 @@ std::uint32_t UploadThread2::Run() {
 // cannot be had, and the completion is still reported.
 platform::Status UploadThread2::RunUpload() {
   try {
-    UploadEnvironment environment = UploadEnvironment::Platform();
+    transport::UploadEnvironment environment = transport::UploadEnvironment::Platform();
     environment.pauseAfterChunkMs = chunkPauseMs;
-    Uploader uploader(listener, request, result, std::move(environment));
+    transport::Uploader uploader(listener, request, result, std::move(environment));
     const platform::Status status = uploader.Upload();
     reply = std::move(uploader.reply);
     return status;
@@ -32,3 +34,5 @@ platform::Status UploadThread2::RunUpload() {
     return platform::StatusFromWin32(platform::kErrorNotEnoughMemory);
   }
 }
+
+}  // namespace upload

@@ -170,21 +170,21 @@ TEST(DebugOutput, LinesStayWholeFromManyThreads) {
 
 TEST(Trace, AnUnopenableKeyKeepsTheStateAndLongNamesKeepThePrefix) {
   TraceCapture capture;
-  TraceSetPrefix("First");
+  diag::TraceSetPrefix("First");
   capture.RemoveKey();
-  TraceSetPrefix("Second");
-  TraceMessage(L"still on");
+  diag::TraceSetPrefix("Second");
+  diag::TraceMessage(L"still on");
   capture.SetSwitch(1);
   for (const char* name : std::vector<const char*>{"", nullptr, "ABCDEFGHIJKLMNOPQRSTUVWXYZ012", "ABCDEFGHIJKLMNOPQRSTUVWXYZ0123"}) {
-    TraceSetPrefix(name);
-    TraceMessage(L"x");
+    diag::TraceSetPrefix(name);
+    diag::TraceMessage(L"x");
   }
-  TraceMessage(L"KRV version = %s; host %S; %d%%", L"5.0 \u00E4", "n\xC3\xA4", 7);
+  diag::TraceMessage(L"KRV version = %s; host %S; %d%%", L"5.0 \u00E4", "n\xC3\xA4", 7);
   capture.SetSwitch(0);
-  TraceSetPrefix("Third");
+  diag::TraceSetPrefix("Third");
   capture.RemoveKey();
-  TraceSetPrefix("Fourth");
-  TraceMessage(L"still off");
+  diag::TraceSetPrefix("Fourth");
+  diag::TraceMessage(L"still off");
   EXPECT_EQ(capture.Bytes(), "[First]still on\n[]x\n[]x\n[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
                              "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
                              "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01KRV version = 5.0 \xC3\xA4; host n\xC3\xA4; 7%\n");

@@ -54,15 +54,15 @@ struct FakeServer {
   }
   std::string Boundary() const { return headers.at(0).substr(headers.at(0).find("boundary=") + 9); }
 
-  UploadEnvironment Environment() {
-    return UploadEnvironment{[this] { return now; }, [this](std::uint32_t ms) { sleeps.push_back(ms), now += ms; },
-                             [this](const UploadRequest&, UploadProgress*, std::unique_ptr<UploadConnection>* out) {
+  transport::UploadEnvironment Environment() {
+    return transport::UploadEnvironment{[this] { return now; }, [this](std::uint32_t ms) { sleeps.push_back(ms), now += ms; },
+                             [this](const transport::UploadRequest&, transport::UploadProgress*, std::unique_ptr<transport::UploadConnection>* out) {
                                *out = std::make_unique<Connection>(*this);
                                return platform::kOk;
                              }};
   }
 
-  class Connection : public UploadConnection {
+  class Connection : public transport::UploadConnection {
    public:
     explicit Connection(FakeServer& server) : s_(server) {}
     platform::Status AddHeader(const std::string& line) override { return s_.headers.push_back(line), platform::kOk; }
@@ -104,9 +104,9 @@ std::string FilePart(const std::string& name, const std::string& file, const std
 class Upload : public TempFolderTest {
  protected:
   platform::Status Run() {
-    UploadEnvironment environment = server.Environment();
+    transport::UploadEnvironment environment = server.Environment();
     environment.pauseAfterChunkMs = pauseMs;
-    return Uploader(&listener, &request, &result, std::move(environment)).Upload();
+    return transport::Uploader(&listener, &request, &result, std::move(environment)).Upload();
   }
 
   std::vector<std::size_t> ChunkSizes() const {
@@ -128,17 +128,17 @@ class Upload : public TempFolderTest {
     request.AddFile(L"f", MakeSparseFile(L"f", size).c_str());
   }
 
-  UploadRequest request;
-  UploadResult result;
-  RecordingListener<UploadProgress> listener;
+  transport::UploadRequest request;
+  transport::UploadResult result;
+  RecordingListener<transport::UploadProgress> listener;
   FakeServer server;
-  std::uint32_t pauseMs = ChunkPause::kDefaultMs;
+  std::uint32_t pauseMs = transport::ChunkPause::kDefaultMs;
 };
 
 TEST_F(Upload, TheWorkedExampleIsByteExactAndItsLengthAnnounced) {
   request.AddField("title", "Sunset");
   request.AddFile(L"PIPfile", MakeFile(L"C:\\p.xml", "0123456789").c_str());
-  Uploader measuring(nullptr, &request, &result, server.Environment());
+  transport::Uploader measuring(nullptr, &request, &result, server.Environment());
   const std::string b = "---------------------------0029482318BE";
   std::uint64_t total = 0;
   std::vector<std::uint64_t> sizes;
@@ -159,12 +159,12 @@ TEST_F(Upload, TheWorkedExampleIsByteExactAndItsLengthAnnounced) {
 // quote or line break escaped.
 TEST_F(Upload, BodiesOfEveryShapeAreWhatTheirLengthAnnounced) {
   struct Case {
-    std::function<void(UploadRequest&)> fill;
+    std::function<void(transport::UploadRequest&)> fill;
     std::string body;
   };
   const Case cases[] = {
-      {[](UploadRequest&) {}, "--{B}--\r\n"},
-      {[](UploadRequest& r) {
+      {[](transport::UploadRequest&) {}, "--{B}--\r\n"},
+      {[](transport::UploadRequest& r) {
          r.AddFile(L"f", MakeFile(L"p", "1").c_str());
          for (const char* name : {"title", "\xC3\xA9t\xC3\xA9", "AP", "Version", "title"}) r.AddField(name, "v");
          r.AddField("tags", nullptr);
@@ -172,7 +172,7 @@ TEST_F(Upload, BodiesOfEveryShapeAreWhatTheirLengthAnnounced) {
        },
        FieldPart("AP", "last") + FieldPart("Version", "v") + FieldPart("tags", "") + FieldPart("title", "v") +
            FieldPart("\xC3\xA9t\xC3\xA9", "v") + FilePart("f", "p", "1") + "--{B}--\r\n"},
-      {[](UploadRequest& r) {
+      {[](transport::UploadRequest& r) {
          const std::wstring path = MakeFile(L"a\"\u4E2D\r\n", "12");
          r.AddFile(L"a", path.c_str());
          r.AddFile(L"e", MakeFile(L"e", "").c_str());
@@ -182,7 +182,7 @@ TEST_F(Upload, BodiesOfEveryShapeAreWhatTheirLengthAnnounced) {
            FilePart("a", "a%22\xE4\xB8\xAD%0D%0A", "12") + "--{B}--\r\n"},
   };
   for (const Case& c : cases) {
-    request = UploadRequest();
+    request = transport::UploadRequest();
     server = FakeServer();
     c.fill(request);
     ASSERT_EQ(Run(), platform::kOk);
@@ -198,7 +198,7 @@ TEST(UploadUrl, AcceptsOnlyPlainHttpOnPort80WithoutExtras) {
       {"http://h/a/../b%20c", "h /a/../b%20c"}, {"http://" + k259 + "/p", k259 + " /p"},
       {"http://h/" + k259.substr(1), "h /" + k259.substr(1)}};
   for (const auto& [url, hostAndPath] : accepted) {
-    UploadRequest request;
+    transport::UploadRequest request;
     EXPECT_TRUE(request.SetUrl(url.c_str())) << url;
     EXPECT_EQ(request.host + " " + request.path, hostAndPath);
   }
@@ -206,12 +206,12 @@ TEST(UploadUrl, AcceptsOnlyPlainHttpOnPort80WithoutExtras) {
            "http://" + k259 + "a/p", "http://h/" + k259, "https://h/p", "HTTP://h/p", "ftp://h/p", "http://h:8080/p",
            "http://user:pw@h/p", "http://h/p?id=1", "http://h/p#top", "http:///p", "http:h/p", "//h/p", "",
            "http://h/a b", "http://h/a\r\nX: y"}) {
-    UploadRequest request;
+    transport::UploadRequest request;
     request.SetUrl("http://before/was");
     EXPECT_FALSE(request.SetUrl(url.c_str())) << url;
     EXPECT_EQ(request.host + request.path, "before/was") << url;
   }
-  EXPECT_FALSE(UploadRequest().SetUrl(nullptr));
+  EXPECT_FALSE(transport::UploadRequest().SetUrl(nullptr));
 }
 
 TEST_F(Upload, FastWritesGrowTheChunkToSixteenMebibytesAndSlowOnesHalveItToTheFloor) {
@@ -262,11 +262,11 @@ TEST_F(Upload, ThePauseAfterEachChunkMovesTheReportsButNotTheChunks) {
                    "229376 229376 0 229376 229376 0 32768", "229376 229376 0 229376 229376 0 32768"}}}) {
     for (const int cancelledPoll : {0, 3}) {
       server = FakeServer();
-      listener = RecordingListener<UploadProgress>();
+      listener = RecordingListener<transport::UploadProgress>();
       listener.cancelAt = [=](int poll) { return poll == cancelledPoll; };
       pauseMs = pause;
       ScriptWriteTimes({300, 300, 300});
-      request = UploadRequest();  // the initial speed estimate again
+      request = transport::UploadRequest();  // the initial speed estimate again
       request.AddFile(L"f", MakeSparseFile(L"f", 224 * KiB).c_str());
       Run();
       const std::size_t chunks = cancelledPoll ? 2 : 3;
@@ -306,13 +306,13 @@ TEST_F(Upload, ACancelIsPolledAfterEveryChunkAndEndsTheBodyUnfinished) {
                         Case{5, {"FileComplete a 0x00000000", "FileComplete b 0x80040301"}, std::string(32, 'b')}}) {
     SCOPED_TRACE(c.cancelledPoll);
     server = FakeServer();
-    listener = RecordingListener<UploadProgress>();
+    listener = RecordingListener<transport::UploadProgress>();
     listener.cancelAt = [&](int poll) { return poll == c.cancelledPoll; };
     request.ClearFiles();
     request.AddFile(L"a", MakeFile(L"a", "first").c_str());
     request.AddFile(L"b", MakeFile(L"b", std::string(32 * KiB + 100, 'b')).c_str());
-    EXPECT_EQ(Run(), UPLOAD_E_CANCELLED);
-    EXPECT_EQ((std::pair{result.hr, result.httpStatus}), (std::pair{UPLOAD_E_CANCELLED, 0xFFFFFFFFu}));
+    EXPECT_EQ(Run(), transport::UPLOAD_E_CANCELLED);
+    EXPECT_EQ((std::pair{result.hr, result.httpStatus}), (std::pair{transport::UPLOAD_E_CANCELLED, 0xFFFFFFFFu}));
     EXPECT_EQ(listener.Only("FileComplete"), c.completions);
     const std::string body = server.Body();
     EXPECT_EQ(body.substr(body.size() - c.bodyEnd.size()), c.bodyEnd);
@@ -383,7 +383,7 @@ TEST(ChunkPauseSetting, OnlyDecimalMillisecondsUpToOneSecondAreTaken) {
            {"0", 0}, {"50", 50}, {"1000", 1000}, {"0007", 7}, {"", {}}, {"1001", {}}, {"-1", {}},
            {"+5", {}}, {" 5", {}}, {"5 ", {}}, {"5ms", {}}, {"0x10", {}}, {"1e3", {}}, {"2.5", {}},
            {"4294967346", {}}, {"99999999999999999999", {}}}) {
-    EXPECT_EQ(ChunkPause::Parse(text), ms) << '"' << text << '"';
+    EXPECT_EQ(transport::ChunkPause::Parse(text), ms) << '"' << text << '"';
   }
 }
 

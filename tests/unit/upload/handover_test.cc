@@ -25,7 +25,7 @@ using namespace test_support;
 using Lines = std::vector<std::string>;
 constexpr std::uint32_t kMessage = 0x802A;
 
-class ProbeThread : public Thread {
+class ProbeThread : public upload::Thread {
  public:
   std::atomic<bool> sawItself{false};
 
@@ -54,11 +54,11 @@ TEST(WorkerThread, RunBeginsOnlyAfterHandleAndIdAreStoredAndJoinGivesItsResultOn
   busy = false;
   for (std::thread& spinner : spinners) spinner.join();
   EXPECT_EQ(ProbeThread().Join(), 0u) << "a thread never started joins at once";
-  struct Throwing : Thread {
+  struct Throwing : upload::Thread {
     std::uint32_t Run() override { throw std::bad_alloc(); }  // would end the process
   } throwing;
   ASSERT_TRUE(throwing.Start());
-  EXPECT_EQ(throwing.Join(), Thread::kRunFailed);
+  EXPECT_EQ(throwing.Join(), upload::Thread::kRunFailed);
 }
 
 // What a test window saw, reached through its user data.
@@ -159,7 +159,7 @@ TEST_F(Windows, AThrowingHandlerLosesOnlyItsMessageAndADestroyWaitsForTheDispatc
 // Posted from a worker, thousands arrive in order while the main thread only
 // runs Python code; a post that the full pending-call queue refuses is retried.
 TEST_F(Windows, ThePumpDeliversEveryPostInOrderWhenPythonRunsEvenAfterARefusal) {
-  InstallPendingCallPump();
+  upload::InstallPendingCallPump();
   static std::atomic<int> othersRun{0};
   int others = 0;
   while (Py_AddPendingCall([](void*) { return ++othersRun, 0; }, nullptr) == 0) ++others;
@@ -184,9 +184,9 @@ TEST_F(Windows, ThePumpDeliversEveryPostInOrderWhenPythonRunsEvenAfterARefusal) 
   EXPECT_EQ(othersRun, others);
 }
 
-class Target : public RecordingListener<BackgroundUploadProgress> {
+class Target : public RecordingListener<transport::BackgroundUploadProgress> {
  public:
-  std::unique_ptr<CUploadProgressProxyWindow>* destroyOnCompletion = nullptr;
+  std::unique_ptr<upload::CUploadProgressProxyWindow>* destroyOnCompletion = nullptr;
   void OnReservedEvent() override { Add("Reserved"); }
   void OnBackgroundUploadComplete(std::int32_t result) override {
     Add("Complete", nullptr, {static_cast<std::uint32_t>(result)});
@@ -195,7 +195,7 @@ class Target : public RecordingListener<BackgroundUploadProgress> {
 };
 
 // Every event once, from a worker, with its text in a buffer overwritten right after.
-void RaiseEveryEvent(CUploadProgressProxyWindow& proxy) {
+void RaiseEveryEvent(upload::CUploadProgressProxyWindow& proxy) {
   std::thread([&] {
     std::wstring buffer;
     auto with = [&](const wchar_t* text) { return (buffer = text).c_str(); };
@@ -226,7 +226,7 @@ const Lines kEveryEvent = {
 
 TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPollAtOnce) {
   Target target;
-  auto proxy = std::make_unique<CUploadProgressProxyWindow>(&target);
+  auto proxy = std::make_unique<upload::CUploadProgressProxyWindow>(&target);
   ASSERT_TRUE(proxy->CreateHiddenWindow());
   RaiseEveryEvent(*proxy);
   EXPECT_TRUE(target.events.empty()) << "nothing runs before the owner dispatches";
@@ -235,7 +235,7 @@ TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPol
   EXPECT_EQ(target.threads, std::vector(kEveryEvent.size(), std::this_thread::get_id()));
 
   target.events.clear();
-  proxy->SetEventFilter(CUploadProgressProxyWindow::kForwardRequestSent);  // all but SendingRequest
+  proxy->SetEventFilter(upload::CUploadProgressProxyWindow::kForwardRequestSent);  // all but SendingRequest
   target.cancelAt = [](int poll) { return poll == 2; };
   std::vector<bool> answers;
   std::thread([&] { answers = {proxy->IsCancelled(), proxy->IsCancelled()}; }).join();
@@ -248,7 +248,7 @@ TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPol
   filtered.erase(filtered.begin() + 4);
   EXPECT_EQ(target.events, filtered);
   Target untouched;
-  CUploadProgressProxyWindow destroyed(&untouched);
+  upload::CUploadProgressProxyWindow destroyed(&untouched);
   ASSERT_TRUE(destroyed.CreateHiddenWindow());
   RaiseEveryEvent(destroyed);
   destroyed.DestroyWindow();  // leak checkers see the dropped commands freed
@@ -258,7 +258,7 @@ TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPol
 
 TEST_F(Windows, ProgressCarriesTheWholePercentOfAllFilesAndTheFilesTimeLeft) {
   ASSERT_EQ(PyRun_SimpleString("reports = []\ndef record(*args): reports.append(args)"), 0);
-  PyPresetUploader uploader(L"api.orbishare.com", L"token", L"5.0", L"Retail", L"uuid");
+  upload::PyPresetUploader uploader(L"api.orbishare.com", L"token", L"5.0", L"Retail", L"uuid");
   uploader.SetCallback(PyDict_GetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), "record"));
   // sent, size, file's time left; nothing to send is all sent, never a division by zero
   for (const auto& [sent, size, left] : std::vector<std::array<std::uint32_t, 3>>{
