@@ -1,12 +1,12 @@
 // The 45 module functions at their positions. Each function is one entry of its
 // class's table in functions_<Class>.cc: its name, then its body, one statement
-// built on binding::Call (runtime/call.h), which
+// built on runtime::Call (runtime/call.h), which
 // runs the shared call sequence: unpack exactly N arguments, convert them left to
 // right (raising the module's error texts), call the native operation, convert its
 // result. To add one:
 //
 // 1. Write its entry at its position in its class's table in functions_<Class>.cc
-//    (using namespace binding); the body is given the name for its error texts:
+//    (using namespace runtime); the body is given the name for its error texts:
 //
 //    // Unicode argument, optional text result (None for no text):
 //    {"OBLoginData_GetEffectByGUID",

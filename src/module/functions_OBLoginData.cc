@@ -13,7 +13,7 @@ namespace module {
 
 namespace {
 
-using namespace binding;
+using namespace runtime;
 
 using HandleMember = HINTERNET service::OBLoginData::*;
 using LinkGetter = std::wstring (service::OBLoginData::*)();

@@ -10,7 +10,7 @@ namespace module {
 
 namespace {
 
-using namespace binding;
+using namespace runtime;
 
 using Member = CString infoEffectURL::*;
 

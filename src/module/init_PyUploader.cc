@@ -29,8 +29,8 @@ extern "C" __attribute__((visibility("default"))) void init_PyUploader() {
       Py_InitModule4(kModuleName, module::FunctionTable(), nullptr, nullptr, kApiVersion);
   if (!module) return;  // the module defines no constants
   // A failure raised here makes the import fail.
-  binding::RaiseOnException(0, [] {
-    binding::InitializeTypeTable(module::ModuleTypeTable());
+  runtime::RaiseOnException(0, [] {
+    runtime::InitializeTypeTable(module::ModuleTypeTable());
     return 0;
   });
 }

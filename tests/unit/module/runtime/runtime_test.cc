@@ -17,7 +17,7 @@
 
 namespace {
 
-using namespace binding;
+using namespace runtime;
 
 // The ring's head for these tests: the types the conversions look up, and one more.
 TypeInfo* Type(const char* mangled) {
