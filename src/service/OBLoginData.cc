@@ -24,7 +24,7 @@ OBLoginData::OBLoginData(const wchar_t* version, const wchar_t* versionType, con
       m_strVersion(platform::WideView(version)),
       m_strVersionType(platform::WideView(versionType)),
       m_strUuid(platform::WideView(uuid)),
-      m_hosts(ServiceHosts::FromEnvironment()) {
+      hosts_(ServiceHosts::FromEnvironment()) {
   m_strSignUpURL = DefaultLink(kSignUpPath);
   m_strForgetPasswordURL = DefaultLink(kForgetPasswordPath);
   diag::TraceSetPrefix(kTraceName);
@@ -33,7 +33,7 @@ OBLoginData::OBLoginData(const wchar_t* version, const wchar_t* versionType, con
   diag::TraceMessage(L"KRV versionType = %s", m_strVersionType.c_str());
 }
 
-OBLoginData::~OBLoginData() { m_runningOperations.Close(); }
+OBLoginData::~OBLoginData() { runningOperations_.Close(); }
 
 std::wstring OBLoginData::GetUserName() const { return m_strUserName; }
 
@@ -58,7 +58,7 @@ void OBLoginData::SetUserName(const std::wstring& name) { m_strUserName = name; 
 void OBLoginData::SetProfileURL(const std::wstring& link) { m_strProfileURL = link; }
 
 std::wstring OBLoginData::DefaultLink(const wchar_t* path) const {
-  return L"http://" + m_hosts.defaultHost + path;
+  return L"http://" + hosts_.defaultHost + path;
 }
 
 }  // namespace service

@@ -108,10 +108,10 @@ class OBLoginData {
   std::wstring m_strUuid;
   Categories m_mapCategory;
   mutable std::mutex m_csToken;
-  const ServiceHosts m_hosts;
+  const ServiceHosts hosts_;
   // Passed by the operations that open a BlockingScope, during which another
   // Python thread may delete the session.
-  platform::OperationGate m_runningOperations;
+  platform::OperationGate runningOperations_;
 };
 
 }  // namespace service

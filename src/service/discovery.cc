@@ -43,7 +43,7 @@ bool IsBareHostName(std::wstring_view value) {
 
 void OBLoginData::InitOBServerURL() {
   // Ends last: after every use of the session, with the lock taken back.
-  const platform::OperationGate::Pass running(m_runningOperations);
+  const platform::OperationGate::Pass running(runningOperations_);
   if (!running) return;
   const platform::BlockingScope blocking;
   EnsureServerUrl();
@@ -58,17 +58,17 @@ void OBLoginData::EnsureServerUrl() {
   DetectServerInfo();
   diag::TraceMessage(L"Get OB server URL from server. URL = %s", m_strServerUrl.c_str());
   if (m_strServerUrl.empty()) {
-    m_strServerUrl = m_hosts.stagingHost;
+    m_strServerUrl = hosts_.stagingHost;
     diag::TraceMessage(L"Use static URL as OB server URL.");
   }
 }
 
 void OBLoginData::DetectServerInfo() {
-  const std::string probeUrl = "http://" + platform::WideToUtf8(m_hosts.detectionHost);
+  const std::string probeUrl = "http://" + platform::WideToUtf8(hosts_.detectionHost);
   if (!CheckServerReachable(probeUrl.c_str())) return;
 
   service::ServiceRequest request;
-  request.host = m_hosts.detectionHost;
+  request.host = hosts_.detectionHost;
   request.verb = kDetectionVerb;
   request.path = std::wstring(kDetectionPage) + L"?ap=lumivanta&version=" +
                  service::EscapePathValue(m_strVersion);

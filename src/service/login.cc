@@ -47,11 +47,11 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
     return 0;
   }
   // Ends last: after every use of the session, with the lock taken back.
-  const platform::OperationGate::Pass running(m_runningOperations);
+  const platform::OperationGate::Pass running(runningOperations_);
   if (!running) return 0;
   const platform::BlockingScope blocking;
   EnsureServerUrl();
-  const std::string probeUrl = "http://" + platform::WideToUtf8(m_hosts.defaultHost);
+  const std::string probeUrl = "http://" + platform::WideToUtf8(hosts_.defaultHost);
   if (!CheckServerReachable(probeUrl.c_str())) {
     diag::TraceMessage(L"Login OB fail: Can not reach the OB server");
     return 0;

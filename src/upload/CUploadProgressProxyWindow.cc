@@ -33,12 +33,12 @@ const std::wstring& CUploadProgressProxyWindow::WindowClassName() {
 }
 
 bool CUploadProgressProxyWindow::CreateHiddenWindow() {
-  window = platform::Window::Create(WindowClassName());
-  if (window) window->SetUserData(this);
-  return window != nullptr;
+  window_ = platform::Window::Create(WindowClassName());
+  if (window_) window_->SetUserData(this);
+  return window_ != nullptr;
 }
 
-void CUploadProgressProxyWindow::DestroyWindow() { window.reset(); }
+void CUploadProgressProxyWindow::DestroyWindow() { window_.reset(); }
 
 // The message map: WM_UPLOAD_COMMAND goes to OnUploadCommand, the rest to the
 // default processing.
@@ -64,8 +64,8 @@ void CUploadProgressProxyWindow::DropCommand(std::intptr_t lparam) {
 // starts and destroyed only after the worker has been joined.
 // Without a window the command has nowhere to go and is freed.
 void CUploadProgressProxyWindow::PostCommand(std::unique_ptr<Command> command) {
-  if (!window) return;
-  window->Post(WM_UPLOAD_COMMAND, 0, reinterpret_cast<std::intptr_t>(command.release()),
+  if (!window_) return;
+  window_->Post(WM_UPLOAD_COMMAND, 0, reinterpret_cast<std::intptr_t>(command.release()),
                &DropCommand);
   std::this_thread::yield();
 }

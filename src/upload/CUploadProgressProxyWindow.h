@@ -85,7 +85,7 @@ class CUploadProgressProxyWindow final : public transport::BackgroundUploadProgr
 
   transport::BackgroundUploadProgress* target;  // not owned
   std::uint32_t eventFilter = kForwardAll;
-  std::unique_ptr<platform::Window> window;
+  std::unique_ptr<platform::Window> window_;
 };
 
 }  // namespace upload

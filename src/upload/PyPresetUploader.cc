@@ -80,11 +80,11 @@ PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* tok
       versionType(Narrow(versionType)) {
   diag::TraceSetPrefix(kTraceName);
   // After the prefix: a refused setting is traced behind this object's name.
-  chunkPauseMs = ChunkPauseFromEnvironment();
+  chunkPauseMs_ = ChunkPauseFromEnvironment();
 }
 
 PyPresetUploader::~PyPresetUploader() {
-  reports.Close();
+  reports_.Close();
   cancelRequested = true;
   interpreter::AllowThreadsGuard unlocked;  // neither the join nor the window's end needs Python
   JoinWorker();
@@ -171,7 +171,7 @@ bool PyPresetUploader::StartWorker() {
   if (proxyWindow->CreateHiddenWindow()) {
     uploadThread.reset(new (std::nothrow)
                            UploadThread2(&uploadRequest, &uploadResult, proxyWindow.get(),
-                                         chunkPauseMs));
+                                         chunkPauseMs_));
     if (uploadThread && uploadThread->Start()) return true;
   }
   uploadThread.reset();
@@ -200,7 +200,7 @@ void PyPresetUploader::DestroyProxyWindow() {
 void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32_t,
                                       std::uint32_t fileTimeLeft, std::uint32_t allSent,
                                       std::uint32_t allSize, std::uint32_t, std::uint32_t) {
-  const platform::OperationGate::Pass report(reports);
+  const platform::OperationGate::Pass report(reports_);
   if (!report) return;
   Call(kProgressFormat, kReportKind, kProgressEvent, Percentage(allSent, allSize),
        static_cast<int>(fileTimeLeft));
@@ -209,7 +209,7 @@ void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32
 // Runs inside the proxy window's own command handler; the callable, called
 // last, may even destroy this object.
 void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
-  const platform::OperationGate::Pass report(reports);
+  const platform::OperationGate::Pass report(reports_);
   if (!report) return;
   diag::TraceMessage(L"PyPresetUploader::OnBackgroundUploadComplete");
   uploadedUrl.clear();

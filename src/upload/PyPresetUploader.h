@@ -96,7 +96,7 @@ class PyPresetUploader : public PyCallbackWnd, public transport::BackgroundUploa
   const std::string uuid;
   const std::string version;
   const std::string versionType;
-  std::uint32_t chunkPauseMs;  // read with the trace switch, at construction
+  std::uint32_t chunkPauseMs_;  // read with the trace switch, at construction
 
   std::wstring uploadedUrl;
   // Touched by the UI thread only while no worker runs, or after the join.
@@ -109,7 +109,7 @@ class PyPresetUploader : public PyCallbackWnd, public transport::BackgroundUploa
   std::atomic<bool> cancelRequested{false};
   // Passed by the handling of each report, which calls Python and may release
   // the interpreter lock, so that another thread may be destroying this object.
-  platform::OperationGate reports;
+  platform::OperationGate reports_;
 };
 
 }  // namespace upload

@@ -11,7 +11,7 @@ namespace upload {
 
 UploadThread2::UploadThread2(transport::UploadRequest* request, transport::UploadResult* result,
                              transport::BackgroundUploadProgress* listener, std::uint32_t chunkPauseMs)
-    : request(request), result(result), listener(listener), chunkPauseMs(chunkPauseMs) {}
+    : request(request), result(result), listener(listener), chunkPauseMs_(chunkPauseMs) {}
 
 std::uint32_t UploadThread2::Run() {
   const platform::Status status = RunUpload();
@@ -25,7 +25,7 @@ std::uint32_t UploadThread2::Run() {
 platform::Status UploadThread2::RunUpload() {
   try {
     transport::UploadEnvironment environment = transport::UploadEnvironment::Platform();
-    environment.pauseAfterChunkMs = chunkPauseMs;
+    environment.pauseAfterChunkMs = chunkPauseMs_;
     transport::Uploader uploader(listener, request, result, std::move(environment));
     const platform::Status status = uploader.Upload();
     reply = std::move(uploader.reply);

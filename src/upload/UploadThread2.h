@@ -36,7 +36,7 @@ class UploadThread2 : public Thread {
   transport::UploadRequest* request;
   transport::UploadResult* result;
   transport::BackgroundUploadProgress* listener;
-  std::uint32_t chunkPauseMs;
+  std::uint32_t chunkPauseMs_;
   std::string reply;
 };
 
