@@ -77,10 +77,8 @@ class Request {
 
   // 0 until a final reply head has arrived.
   std::uint32_t status_code() const;
-  // What has been read of the reply body.
-  const std::string& body() const;
-  // The reply body moved out, so that a large one is not copied; body() is
-  // empty afterwards.
+  // The reply body read, moved out so that a large one is not copied; empty
+  // afterwards.
   std::string TakeBody();
 
  private:

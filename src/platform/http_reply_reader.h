@@ -22,7 +22,6 @@ class ReplyReader {
   // True once a final (non-1xx) head has ended.
   bool head_received() const { return head_received_; }
   std::uint32_t status_code() const { return head_received_ ? status_code_ : 0; }
-  const std::string& body() const { return body_; }
   std::string TakeBody() { return std::move(body_); }
 
  private:

@@ -185,8 +185,6 @@ platform::Status Request::Send(std::string_view body) {
 
 std::uint32_t Request::status_code() const { return state_->reader().status_code(); }
 
-const std::string& Request::body() const { return state_->reader().body(); }
-
 std::string Request::TakeBody() { return state_->reader().TakeBody(); }
 
 }  // namespace platform::http

@@ -23,7 +23,7 @@ class UploadConnection {
   virtual platform::Status End() = 0;
   // False when the reply carried no status.
   virtual bool QueryStatusCode(std::uint32_t* code) = 0;
-  // The reply body, as much of it as could be read.
+  // The reply body, as much of it as could be read; asked for once.
   virtual std::string ReadReply() = 0;
 };
 
