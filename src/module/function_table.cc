@@ -47,6 +47,8 @@
 //      getters of CString and HINTERNET members (the operation returns a new heap copy).
 //    Delete<T>(args, name, type, "T *") and Register(args, type) are the whole body of
 //    the delete_ and _swigregister functions.
+//    Where a helper template makes the whole body, the entry names it:
+//    {"OBLoginData_m_hConnect_get", GetHandle<&OBLoginData::m_hConnect>}.
 // 2. Raise the class's count in function_table.h.
 #include "module/function_table.h"
 

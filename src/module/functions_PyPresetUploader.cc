@@ -11,11 +11,12 @@ namespace module {
 namespace {
 
 using namespace runtime;
+using upload::PyPresetUploader;
 
 constexpr char kUploaderType[] = "PyPresetUploader *";
 
-PointerKind<upload::PyPresetUploader> Uploader() {
-  return Pointer<upload::PyPresetUploader>(Type(TypeId::PyPresetUploader), kUploaderType);
+PointerKind<PyPresetUploader> Uploader() {
+  return Pointer<PyPresetUploader>(Type(TypeId::PyPresetUploader), kUploaderType);
 }
 
 }  // namespace
@@ -27,19 +28,19 @@ const ModuleFunction kPyPresetUploaderFunctions[] = {
                    NewPointer(Type(TypeId::PyPresetUploader), POINTER_OWN | POINTER_NOSHADOW),
                    [](const wchar_t* serverHost, const wchar_t* token, const wchar_t* version,
                       const wchar_t* versionType, const wchar_t* uuid) {
-                     return new upload::PyPresetUploader(serverHost, token, version, versionType, uuid);
+                     return new PyPresetUploader(serverHost, token, version, versionType, uuid);
                    },
                    WideString(), WideString(), WideString(), WideString(), WideString());
      }},
     {"delete_PyPresetUploader",  // 40
      [](PyObject* args, const char* name) {
-       return Delete<upload::PyPresetUploader>(args, name,
+       return Delete<PyPresetUploader>(args, name,
                                        Type(TypeId::PyPresetUploader), kUploaderType);
      }},
     {"PyPresetUploader_SetCallback",  // 41
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsInt{},
-                   [](upload::PyPresetUploader* self, PyObject* callable) { return self->SetCallback(callable); },
+                   [](PyPresetUploader* self, PyObject* callable) { return self->SetCallback(callable); },
                    Uploader(), Object());
      }},
     // The preset file, images 1 to 12, template key, title, category, tags and
@@ -48,19 +49,19 @@ const ModuleFunction kPyPresetUploaderFunctions[] = {
      [](PyObject* args, const char* name) {
        const WideStringKind text = WideString();
        return Call(args, name, ReturnsInt{},
-                   [](upload::PyPresetUploader* self, auto... texts) { return self->StartUpload(texts...); },
+                   [](PyPresetUploader* self, auto... texts) { return self->StartUpload(texts...); },
                    Uploader(), text, text, text, text, text, text, text, text, text, text, text, text,
                    text, text, text, text, text, text);
      }},
     {"PyPresetUploader_CancelUpload",  // 43
      [](PyObject* args, const char* name) {
        return Call(args, name, ReturnsNone{},
-                   [](upload::PyPresetUploader* self) { self->CancelUpload(); }, Uploader());
+                   [](PyPresetUploader* self) { self->CancelUpload(); }, Uploader());
      }},
     {"PyPresetUploader_GetUploadedFileUrl",  // 44
      [](PyObject* args, const char* name) {
        return Call(args, name, PassedThrough{},
-                   [](upload::PyPresetUploader* self) { return self->GetUploadedFileUrl(); }, Uploader());
+                   [](PyPresetUploader* self) { return self->GetUploadedFileUrl(); }, Uploader());
      }},
     {"PyPresetUploader_swigregister",  // 45
      [](PyObject* args, const char*) {

@@ -22,16 +22,18 @@ PointerKind<infoEffectURL> Record(OnNull onNull = OnNull::kRefuse) {
 
 ReferenceKind<CString> Text() { return Reference<CString>(Type(TypeId::CString), "CString"); }
 
-PyObject* SetMember(PyObject* args, const char* function, Member member) {
+template <Member member>
+PyObject* SetMember(PyObject* args, const char* function) {
   return Call(args, function, ReturnsNone{},
-              [member](infoEffectURL* record, const CString& value) { record->*member = value; },
+              [](infoEffectURL* record, const CString& value) { record->*member = value; },
               Record(OnNull::kSkipCall), Text());
 }
 
 // A new heap copy of the member, owned by the pointer object returned.
-PyObject* GetMember(PyObject* args, const char* function, Member member) {
+template <Member member>
+PyObject* GetMember(PyObject* args, const char* function) {
   return Call(args, function, NewPointer(Type(TypeId::CString), POINTER_OWN),
-              [member](infoEffectURL* record) { return new CString(record->*member); }, Record());
+              [](infoEffectURL* record) { return new CString(record->*member); }, Record());
 }
 
 }  // namespace
@@ -46,30 +48,12 @@ const ModuleFunction kInfoEffectURLFunctions[] = {
                    },
                    Text(), Text(), Text());
      }},
-    {"infoEffectURL_strEffect_set",  // 2
-     [](PyObject* args, const char* name) {
-       return SetMember(args, name, &infoEffectURL::strEffect);
-     }},
-    {"infoEffectURL_strEffect_get",  // 3
-     [](PyObject* args, const char* name) {
-       return GetMember(args, name, &infoEffectURL::strEffect);
-     }},
-    {"infoEffectURL_strTag_set",  // 4
-     [](PyObject* args, const char* name) {
-       return SetMember(args, name, &infoEffectURL::strTag);
-     }},
-    {"infoEffectURL_strTag_get",  // 5
-     [](PyObject* args, const char* name) {
-       return GetMember(args, name, &infoEffectURL::strTag);
-     }},
-    {"infoEffectURL_strURL_set",  // 6
-     [](PyObject* args, const char* name) {
-       return SetMember(args, name, &infoEffectURL::strURL);
-     }},
-    {"infoEffectURL_strURL_get",  // 7
-     [](PyObject* args, const char* name) {
-       return GetMember(args, name, &infoEffectURL::strURL);
-     }},
+    {"infoEffectURL_strEffect_set", SetMember<&infoEffectURL::strEffect>},  // 2
+    {"infoEffectURL_strEffect_get", GetMember<&infoEffectURL::strEffect>},  // 3
+    {"infoEffectURL_strTag_set", SetMember<&infoEffectURL::strTag>},  // 4
+    {"infoEffectURL_strTag_get", GetMember<&infoEffectURL::strTag>},  // 5
+    {"infoEffectURL_strURL_set", SetMember<&infoEffectURL::strURL>},  // 6
+    {"infoEffectURL_strURL_get", GetMember<&infoEffectURL::strURL>},  // 7
     {"delete_infoEffectURL",  // 8
      [](PyObject* args, const char* name) {
        return Delete<infoEffectURL>(args, name, Type(TypeId::infoEffectURL),
