@@ -43,6 +43,8 @@ constexpr std::uint32_t kSuccessClass = 2;
 
 // The system's narrow texts, in the ANSI code page; null gives an empty text.
 std::string Narrow(const wchar_t* text) { return platform::WideToAnsi(platform::WideView(text)); }
+// A text field's value, in UTF-8 whatever the code page; null gives an empty value.
+std::string Utf8(const wchar_t* text) { return platform::WideToUtf8(platform::WideView(text)); }
 
 // Only a regular file can be sent: a FIFO or device would hold the upload.
 bool FileGiven(const wchar_t* path) { return path != nullptr && platform::IsRegularFile(path); }
@@ -133,17 +135,17 @@ bool PyPresetUploader::SetUploadUrl() {
   return url.size() <= kUrlLimit && uploadRequest.SetUrl(url.c_str());
 }
 
-// Title, tags, description, category and template key: sent in the ANSI code
-// page, as the other texts are.
+// Title, tags, description, category and template key go in UTF-8, the other
+// texts in the ANSI code page (the same bytes on this platform).
 void PyPresetUploader::AddTextFields(const Texts& texts) {
   uploadRequest.AddField("token", token.c_str());
-  uploadRequest.AddField("title", Narrow(texts.title).c_str());
-  uploadRequest.AddField("tags", Narrow(texts.tags).c_str());
-  uploadRequest.AddField("description", Narrow(texts.description).c_str());
-  uploadRequest.AddField("category", Narrow(texts.category).c_str());
+  uploadRequest.AddField("title", Utf8(texts.title).c_str());
+  uploadRequest.AddField("tags", Utf8(texts.tags).c_str());
+  uploadRequest.AddField("description", Utf8(texts.description).c_str());
+  uploadRequest.AddField("category", Utf8(texts.category).c_str());
   uploadRequest.AddField("templatetype", "PRESET");
   uploadRequest.AddField("PIPtype", "0");
-  uploadRequest.AddField("templateKey", Narrow(texts.templateKey).c_str());
+  uploadRequest.AddField("templateKey", Utf8(texts.templateKey).c_str());
   uploadRequest.AddField("AspectRatio", "1:1");
   uploadRequest.AddField("productName", "Quillmark Lumivanta");
   uploadRequest.AddField("AP", "KRV");
