@@ -56,8 +56,12 @@ std::wstring Lowered(std::wstring_view text) {
 std::string_view Trim(std::string_view text) { return TrimBlanks(text); }
 std::wstring_view Trim(std::wstring_view text) { return TrimBlanks(text); }
 
+bool IsDigit(wchar_t c) { return c >= L'0' && c <= L'9'; }
+
+bool IsLetterOrDigit(wchar_t c) { return IsDigit(c) || (Lower(c) >= L'a' && Lower(c) <= L'z'); }
+
 std::optional<unsigned> HexDigitValue(wchar_t c) {
-  if (c >= L'0' && c <= L'9') return c - L'0';
+  if (IsDigit(c)) return c - L'0';
   if (c >= L'a' && c <= L'f') return c - L'a' + 10;
   if (c >= L'A' && c <= L'F') return c - L'A' + 10;
   return std::nullopt;

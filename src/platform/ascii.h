@@ -23,6 +23,10 @@ std::wstring Lowered(std::wstring_view text);
 std::string_view Trim(std::string_view text);
 std::wstring_view Trim(std::wstring_view text);
 
+// 0-9, and A-Z or a-z besides.
+bool IsDigit(wchar_t c);
+bool IsLetterOrDigit(wchar_t c);
+
 // The value of one hexadecimal digit of either case; nothing for any other character.
 std::optional<unsigned> HexDigitValue(wchar_t c);
 

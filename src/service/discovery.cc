@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "diag/trace.h"
+#include "platform/ascii.h"
 #include "platform/blocking_scope.h"
 #include "platform/text.h"
 #include "platform/xml.h"
@@ -29,8 +30,7 @@ struct InfoField {
 };
 
 bool IsHostNameCharacter(wchar_t c) {
-  return (c >= L'a' && c <= L'z') || (c >= L'A' && c <= L'Z') || (c >= L'0' && c <= L'9') ||
-         c == L'-' || c == L'.';
+  return platform::IsLetterOrDigit(c) || c == L'-' || c == L'.';
 }
 
 // The server host is spliced into every later URL: a port, a path, a user or a
