@@ -117,7 +117,7 @@ class Interpreter {
 };
 
 // One progress report of a file that streams, as the engine raises it.
-void PostReport(CUploadProgressProxyWindow& proxy, long index) {
+void PostReport(upload::CUploadProgressProxyWindow& proxy, long index) {
   const auto sent = static_cast<std::uint32_t>(index % kPresetSize);
   proxy.OnFileProgress(kPresetPath, sent, kPresetSize, 7, sent, kPresetSize, 7, 5600);
 }
@@ -129,7 +129,7 @@ struct BurstCost {
 
 // The worker posts a burst while the UI thread waits outside Python; then the
 // UI thread runs the pending call that takes them all.
-BurstCost MeasureBurst(CUploadProgressProxyWindow& proxy) {
+BurstCost MeasureBurst(upload::CUploadProgressProxyWindow& proxy) {
   Interpreter::ResetDelivered();
   double workerCpu = 0;
   std::thread worker([&] {
@@ -144,7 +144,7 @@ BurstCost MeasureBurst(CUploadProgressProxyWindow& proxy) {
   return BurstCost{workerCpu / kBurstReports * 1e6, uiCpu / kBurstReports * 1e6};
 }
 
-BurstCost MedianBurst(CUploadProgressProxyWindow& proxy) {
+BurstCost MedianBurst(upload::CUploadProgressProxyWindow& proxy) {
   std::vector<double> post;
   std::vector<double> dispatch;
   for (int round = 0; round < kBurstRounds; ++round) {
@@ -156,7 +156,7 @@ BurstCost MedianBurst(CUploadProgressProxyWindow& proxy) {
 }
 
 // Posts at `rate` per second for the window.
-void PostAtRate(CUploadProgressProxyWindow& proxy, RateRun& run, double rate) {
+void PostAtRate(upload::CUploadProgressProxyWindow& proxy, RateRun& run, double rate) {
   const Clock::time_point start = Clock::now();
   for (Clock::duration elapsed{}; elapsed < kRateWindow; elapsed = Clock::now() - start) {
     const long due = rate == kFlatOut ? run.posted + 1 : static_cast<long>(rate * Seconds(elapsed));
@@ -178,7 +178,7 @@ struct RateResult {
   long posted;
 };
 
-RateResult MeasureRate(CUploadProgressProxyWindow& proxy, double rate) {
+RateResult MeasureRate(upload::CUploadProgressProxyWindow& proxy, double rate) {
   Interpreter::ResetDelivered();
   RateRun run;
   g_run = &run;
@@ -215,7 +215,7 @@ struct RateSummary {
   double worstUiMicros = 0;  // UI thread CPU per report in a steady flow
 };
 
-RateSummary PrintRates(CUploadProgressProxyWindow& proxy) {
+RateSummary PrintRates(upload::CUploadProgressProxyWindow& proxy) {
   std::printf("\nworker posting for %.0f s, UI thread turning every %.0f ms\n",
               Seconds(kRateWindow), kUiTurnSeconds * 1e3);
   std::printf("  %10s %12s %16s %14s  %s\n", "asked /s", "posted /s", "last report ms",
@@ -238,9 +238,9 @@ RateSummary PrintRates(CUploadProgressProxyWindow& proxy) {
 
 int main() {
   Interpreter interpreter;
-  PyPresetUploader uploader(L"api.orbishare.com", L"0123456789abcdef01234567", L"5.0", L"Retail",
+  upload::PyPresetUploader uploader(L"api.orbishare.com", L"0123456789abcdef01234567", L"5.0", L"Retail",
                             L"7f3c2a10-0000-4000-8000-000000000001");
-  CUploadProgressProxyWindow proxy(&uploader);
+  upload::CUploadProgressProxyWindow proxy(&uploader);
   if (!proxy.CreateHiddenWindow()) return 2;
 
   uploader.SetCallback(nullptr);

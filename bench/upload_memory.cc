@@ -88,7 +88,7 @@ class DiscardServer {
   std::thread thread_;
 };
 
-class QuietListener : public UploadProgress {
+class QuietListener : public transport::UploadProgress {
  public:
   void OnResolvingName(const wchar_t*) override {}
   void OnNameResolved(const wchar_t*) override {}
@@ -123,19 +123,19 @@ int main(int argc, char** argv) {
   std::filesystem::resize_file(path, static_cast<std::uintmax_t>(mib) * kMiB);
 
   DiscardServer server;
-  UploadRequest request;
+  transport::UploadRequest request;
   request.host = "127.0.0.1";
   request.path = "/servlet/uploadTemplate";
   request.AddFile(L"PIPfile", std::wstring(path.wstring()).c_str());
-  UploadResult result;
+  transport::UploadResult result;
   QuietListener listener;
-  UploadEnvironment environment = UploadEnvironment::Platform();
-  environment.openConnection = HttpUploadConnection::Opener(server.port());
+  transport::UploadEnvironment environment = transport::UploadEnvironment::Platform();
+  environment.openConnection = transport::HttpUploadConnection::Opener(server.port());
 
   const long before = PeakKiB();
   const auto start = std::chrono::steady_clock::now();
-  Uploader uploader(&listener, &request, &result, environment);
-  const win::Status status = uploader.Upload();
+  transport::Uploader uploader(&listener, &request, &result, environment);
+  const platform::Status status = uploader.Upload();
   const double seconds =
       std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
   const long growth = PeakKiB() - before;
@@ -147,5 +147,5 @@ int main(int argc, char** argv) {
   const bool bounded = growth <= kAllowedGrowthKiB;
   std::printf("%s: memory %s bounded by the chunk size\n", bounded ? "PASS" : "FAIL",
               bounded ? "stays" : "is not");
-  return status == win::kOk && bounded ? 0 : 1;
+  return status == platform::kOk && bounded ? 0 : 1;
 }

@@ -13,6 +13,8 @@
 #include "platform/text.h"
 #include "platform/wide_format.h"
 
+namespace diag {
+
 namespace {
 
 constexpr wchar_t kSwitchKey[] = L"SOFTWARE\\Quillmark\\Lumivanta";
@@ -30,7 +32,7 @@ wchar_t tracePrefix[kPrefixCapacity] = {};
 
 // "[name]", cut to the buffer's 29 characters.
 void FormatPrefix(const char* name) {
-  const std::wstring prefix = L"[" + text::Utf8ToWide(name) + L"]";
+  const std::wstring prefix = L"[" + platform::Utf8ToWide(name) + L"]";
   const std::size_t length = std::min(prefix.size(), kPrefixCapacity - 1);
   std::lock_guard<std::mutex> lock(prefixLock);
   std::wmemcpy(tracePrefix, prefix.data(), length);
@@ -43,7 +45,7 @@ std::wstring CurrentPrefix() {
 }
 
 bool ReadSwitch(bool& enabled) {
-  const auto key = registry::Key::OpenLocalMachine(kSwitchKey);
+  const auto key = platform::RegistryKey::OpenLocalMachine(kSwitchKey);
   if (!key) return false;
   enabled = key->ReadNumber(kSwitchValue).value_or(0) != 0;
   return true;
@@ -64,7 +66,9 @@ void TraceMessage(const wchar_t* format, ...) {
   wchar_t text[kTextCapacity];
   std::va_list args;
   va_start(args, format);
-  const std::size_t length = wide_format::FormatCut(text, kTextCapacity, format, args);
+  const std::size_t length = platform::FormatCut(text, kTextCapacity, format, args);
   va_end(args);
-  debug_output::Write(CurrentPrefix().append(text, length).append(L"\n"));
+  platform::WriteDebugOutput(CurrentPrefix().append(text, length).append(L"\n"));
 }
+
+}  // namespace diag

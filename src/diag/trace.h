@@ -4,8 +4,10 @@
 //
 // Never pass an account name, a password or a sign-in token to TraceMessage, in
 // any form (escaped, in a URL or a request body). Tests capture the trace output
-// and scan it for the secrets they used (tests/unit/support/fixtures.h).
+// and scan it for the secrets they used (tests/python/test_service.py).
 #pragma once
+
+namespace diag {
 
 // Reads the switch again and sets the prefix to "[name]". A key that cannot be
 // opened keeps the previous state; a missing or unreadable value turns the trace
@@ -18,3 +20,5 @@ void TraceSetPrefix(const char* name);
 void TraceMessage(const wchar_t* format, ...);
 
 inline constexpr int kTraceTextLimit = 1023;
+
+}  // namespace diag

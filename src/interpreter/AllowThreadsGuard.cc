@@ -4,6 +4,8 @@
 
 #include "interpreter/InterpreterLockHeld.h"
 
+namespace interpreter {
+
 void* AllowThreadsGuard::ReleaseInterpreterLock() {
   return InterpreterLockHeld() ? PyEval_SaveThread() : nullptr;
 }
@@ -11,3 +13,5 @@ void* AllowThreadsGuard::ReleaseInterpreterLock() {
 void AllowThreadsGuard::RetakeInterpreterLock(void* released) {
   if (released != nullptr) PyEval_RestoreThread(static_cast<PyThreadState*>(released));
 }
+
+}  // namespace interpreter

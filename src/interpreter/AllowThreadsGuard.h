@@ -1,5 +1,7 @@
 #pragma once
 
+namespace interpreter {
+
 // Releases the interpreter lock for the guard's scope when the calling thread
 // holds it, so that blocking work lets other Python threads run; does nothing
 // for callers without the lock. Create and destroy it on the same thread.
@@ -19,3 +21,5 @@ class AllowThreadsGuard {
  private:
   void* const released_;
 };
+
+}  // namespace interpreter

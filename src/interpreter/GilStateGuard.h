@@ -2,6 +2,8 @@
 
 #include <Python.h>
 
+namespace interpreter {
+
 // Holds the interpreter lock for the guard's scope, whether or not the calling
 // thread held it already.
 class GilStateGuard {
@@ -14,3 +16,5 @@ class GilStateGuard {
  private:
   const PyGILState_STATE state_;
 };
+
+}  // namespace interpreter

@@ -3,6 +3,8 @@
 
 #include "interpreter/OnInterpreterMainThread.h"
 
+namespace interpreter {
+
 // Thread states are listed newest first, so the last one belongs to the thread
 // that initialised the interpreter: its main thread.
 bool OnInterpreterMainThread() {
@@ -11,3 +13,5 @@ bool OnInterpreterMainThread() {
   while (PyThreadState* next = PyThreadState_Next(oldest)) oldest = next;
   return oldest->thread_id == PyThread_get_thread_ident();
 }
+
+}  // namespace interpreter

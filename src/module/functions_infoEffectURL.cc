@@ -1,4 +1,6 @@
-#include "module/functions_infoEffectURL.h"
+#include "module/function_table.h"
+
+#include <iterator>
 
 #include "module/infoEffectURL.h"
 #include "module/runtime/call.h"
@@ -8,7 +10,7 @@ namespace module {
 
 namespace {
 
-using namespace binding;
+using namespace runtime;
 
 using Member = CString infoEffectURL::*;
 
@@ -20,60 +22,48 @@ PointerKind<infoEffectURL> Record(OnNull onNull = OnNull::kRefuse) {
 
 ReferenceKind<CString> Text() { return Reference<CString>(Type(TypeId::CString), "CString"); }
 
-PyObject* SetMember(PyObject* args, const char* function, Member member) {
+template <Member member>
+PyObject* SetMember(PyObject* args, const char* function) {
   return Call(args, function, ReturnsNone{},
-              [member](infoEffectURL* record, const CString& value) { record->*member = value; },
+              [](infoEffectURL* record, const CString& value) { record->*member = value; },
               Record(OnNull::kSkipCall), Text());
 }
 
 // A new heap copy of the member, owned by the pointer object returned.
-PyObject* GetMember(PyObject* args, const char* function, Member member) {
+template <Member member>
+PyObject* GetMember(PyObject* args, const char* function) {
   return Call(args, function, NewPointer(Type(TypeId::CString), POINTER_OWN),
-              [member](infoEffectURL* record) { return new CString(record->*member); }, Record());
+              [](infoEffectURL* record) { return new CString(record->*member); }, Record());
 }
 
 }  // namespace
 
-PyObject* new_infoEffectURL(PyObject*, PyObject* args) {
-  return Call(args, "new_infoEffectURL",
-              NewPointer(Type(TypeId::infoEffectURL), POINTER_OWN | POINTER_NOSHADOW),
-              [](const CString& effect, const CString& tag, const CString& url) {
-                return new infoEffectURL(effect, tag, url);
-              },
-              Text(), Text(), Text());
-}
-
-PyObject* infoEffectURL_strEffect_set(PyObject*, PyObject* args) {
-  return SetMember(args, "infoEffectURL_strEffect_set", &infoEffectURL::strEffect);
-}
-
-PyObject* infoEffectURL_strEffect_get(PyObject*, PyObject* args) {
-  return GetMember(args, "infoEffectURL_strEffect_get", &infoEffectURL::strEffect);
-}
-
-PyObject* infoEffectURL_strTag_set(PyObject*, PyObject* args) {
-  return SetMember(args, "infoEffectURL_strTag_set", &infoEffectURL::strTag);
-}
-
-PyObject* infoEffectURL_strTag_get(PyObject*, PyObject* args) {
-  return GetMember(args, "infoEffectURL_strTag_get", &infoEffectURL::strTag);
-}
-
-PyObject* infoEffectURL_strURL_set(PyObject*, PyObject* args) {
-  return SetMember(args, "infoEffectURL_strURL_set", &infoEffectURL::strURL);
-}
-
-PyObject* infoEffectURL_strURL_get(PyObject*, PyObject* args) {
-  return GetMember(args, "infoEffectURL_strURL_get", &infoEffectURL::strURL);
-}
-
-PyObject* delete_infoEffectURL(PyObject*, PyObject* args) {
-  return Delete<infoEffectURL>(args, "delete_infoEffectURL", Type(TypeId::infoEffectURL),
-                               kRecordType);
-}
-
-PyObject* infoEffectURL_swigregister(PyObject*, PyObject* args) {
-  return Register(args, Type(TypeId::infoEffectURL));
-}
+const ModuleFunction kInfoEffectURLFunctions[] = {
+    {"new_infoEffectURL",  // 1
+     [](PyObject* args, const char* name) {
+       return Call(args, name,
+                   NewPointer(Type(TypeId::infoEffectURL), POINTER_OWN | POINTER_NOSHADOW),
+                   [](const CString& effect, const CString& tag, const CString& url) {
+                     return new infoEffectURL(effect, tag, url);
+                   },
+                   Text(), Text(), Text());
+     }},
+    {"infoEffectURL_strEffect_set", SetMember<&infoEffectURL::strEffect>},  // 2
+    {"infoEffectURL_strEffect_get", GetMember<&infoEffectURL::strEffect>},  // 3
+    {"infoEffectURL_strTag_set", SetMember<&infoEffectURL::strTag>},  // 4
+    {"infoEffectURL_strTag_get", GetMember<&infoEffectURL::strTag>},  // 5
+    {"infoEffectURL_strURL_set", SetMember<&infoEffectURL::strURL>},  // 6
+    {"infoEffectURL_strURL_get", GetMember<&infoEffectURL::strURL>},  // 7
+    {"delete_infoEffectURL",  // 8
+     [](PyObject* args, const char* name) {
+       return Delete<infoEffectURL>(args, name, Type(TypeId::infoEffectURL),
+                                    kRecordType);
+     }},
+    {"infoEffectURL_swigregister",  // 9
+     [](PyObject* args, const char*) {
+       return Register(args, Type(TypeId::infoEffectURL));
+     }},
+};
+static_assert(std::size(kInfoEffectURLFunctions) == kInfoEffectURLCount);
 
 }  // namespace module

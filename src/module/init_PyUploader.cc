@@ -20,17 +20,17 @@ extern "C" __attribute__((visibility("default"))) void init_PyUploader() {
   // What loading the library sets up: the HTTP library, the interpreter lock for
   // the worker and probe threads, and its release during the lower layers'
   // blocking waits.
-  http::GlobalInit();
+  platform::http::GlobalInit();
   PyEval_InitThreads();
-  InstallBlockingRelease(
-      {&AllowThreadsGuard::ReleaseInterpreterLock, &AllowThreadsGuard::RetakeInterpreterLock});
+  platform::InstallBlockingRelease(
+      {&interpreter::AllowThreadsGuard::ReleaseInterpreterLock, &interpreter::AllowThreadsGuard::RetakeInterpreterLock});
 
   PyObject* module =
       Py_InitModule4(kModuleName, module::FunctionTable(), nullptr, nullptr, kApiVersion);
   if (!module) return;  // the module defines no constants
   // A failure raised here makes the import fail.
-  binding::RaiseOnException(0, [] {
-    binding::InitializeTypeTable(module::ModuleTypeTable());
+  runtime::RaiseOnException(0, [] {
+    runtime::InitializeTypeTable(module::ModuleTypeTable());
     return 0;
   });
 }

@@ -7,8 +7,8 @@ namespace module {
 namespace {
 
 // Lives as long as the process: other modules of the ring keep pointers into it.
-binding::ModuleTypes& Types() {
-  static auto* types = new binding::ModuleTypes({
+runtime::ModuleTypes& Types() {
+  static auto* types = new runtime::ModuleTypes({
       {"_p_CString", "CString *"},
       {"_p_HINTERNET", "HINTERNET *"},
       {"_p_OBLoginData", "OBLoginData *"},
@@ -32,8 +32,8 @@ binding::ModuleTypes& Types() {
 
 }  // namespace
 
-binding::TypeTable& ModuleTypeTable() { return Types().table(); }
+runtime::TypeTable& ModuleTypeTable() { return Types().table(); }
 
-binding::TypeInfo* Type(TypeId id) { return Types()[static_cast<size_t>(id)]; }
+runtime::TypeInfo* Type(TypeId id) { return Types()[static_cast<size_t>(id)]; }
 
 }  // namespace module

@@ -33,9 +33,9 @@ enum class TypeId {
 };
 
 // The module's table, handed to InitializeTypeTable by the module's init.
-binding::TypeTable& ModuleTypeTable();
+runtime::TypeTable& ModuleTypeTable();
 
 // The ring's TypeInfo for `id` (valid once the module is initialized).
-binding::TypeInfo* Type(TypeId id);
+runtime::TypeInfo* Type(TypeId id);
 
 }  // namespace module

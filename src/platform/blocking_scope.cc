@@ -2,6 +2,8 @@
 
 #include <atomic>
 
+namespace platform {
+
 namespace {
 
 std::atomic<void* (*)()> g_release{nullptr};
@@ -25,3 +27,5 @@ BlockingScope::BlockingScope() : retake_(g_retake.load()), released_(ReleaseInst
 BlockingScope::~BlockingScope() {
   if (released_ != nullptr) retake_(released_);
 }
+
+}  // namespace platform

@@ -5,6 +5,8 @@
 // With nothing installed a scope does nothing.
 #pragma once
 
+namespace platform {
+
 struct BlockingRelease {
   void* (*release)();              // null result: nothing was let go
   void (*retake)(void* released);  // given what release returned, when not null
@@ -25,3 +27,5 @@ class BlockingScope {
   void (*const retake_)(void*);
   void* const released_;
 };
+
+}  // namespace platform

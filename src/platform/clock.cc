@@ -3,7 +3,7 @@
 #include <chrono>
 #include <thread>
 
-namespace timing {
+namespace platform {
 
 std::uint32_t TickCount() {
   const auto since_start = std::chrono::steady_clock::now().time_since_epoch();
@@ -15,4 +15,4 @@ void Sleep(std::uint32_t milliseconds) {
   std::this_thread::sleep_for(std::chrono::milliseconds(milliseconds));
 }
 
-}  // namespace timing
+}  // namespace platform

@@ -3,11 +3,11 @@
 
 #include <cstdint>
 
-namespace timing {
+namespace platform {
 
 // Milliseconds of a steady clock, wrapping at 2^32 (about 49.7 days).
 std::uint32_t TickCount();
 
 void Sleep(std::uint32_t milliseconds);
 
-}  // namespace timing
+}  // namespace platform

@@ -6,7 +6,7 @@
 
 #include <memory>
 
-namespace curl {
+namespace platform::curl {
 
 struct EasyDeleter {
   void operator()(CURL* handle) const { curl_easy_cleanup(handle); }
@@ -39,4 +39,4 @@ inline bool Append(List& list, const char* line) {
   return true;
 }
 
-}  // namespace curl
+}  // namespace platform::curl

@@ -9,7 +9,7 @@
 
 #include "platform/text.h"
 
-namespace debug_output {
+namespace platform {
 namespace {
 
 constexpr mode_t kNewFileMode = 0644;
@@ -18,7 +18,7 @@ constexpr mode_t kNewFileMode = 0644;
 class OutputFile {
  public:
   OutputFile() {
-    const char* path = std::getenv(kOutputPathVariable);
+    const char* path = std::getenv(kDebugOutputPathVariable);
     if (path && *path) {
       fd_ = ::open(path, O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, kNewFileMode);
       owned_ = fd_ >= 0;
@@ -39,8 +39,8 @@ class OutputFile {
 
 }  // namespace
 
-void Write(std::wstring_view line) {
-  const std::string bytes = text::WideToUtf8(line);
+void WriteDebugOutput(std::wstring_view line) {
+  const std::string bytes = platform::WideToUtf8(line);
   OutputFile out;
   if (out.fd() < 0) return;
   ssize_t written;
@@ -49,4 +49,4 @@ void Write(std::wstring_view line) {
   } while (written < 0 && errno == EINTR);
 }
 
-}  // namespace debug_output
+}  // namespace platform

@@ -5,11 +5,11 @@
 
 #include <string_view>
 
-namespace debug_output {
+namespace platform {
 
-inline constexpr char kOutputPathVariable[] = "PYUPLOADER_DEBUG_OUTPUT";
+inline constexpr char kDebugOutputPathVariable[] = "PYUPLOADER_DEBUG_OUTPUT";
 
 // Writes `line` as it is (the caller ends it with a line feed). Failures are silent.
-void Write(std::wstring_view line);
+void WriteDebugOutput(std::wstring_view line);
 
-}  // namespace debug_output
+}  // namespace platform

@@ -9,19 +9,19 @@
 
 #include "platform/text.h"
 
-namespace file {
+namespace platform {
 namespace {
 
 constexpr std::size_t kReadPieceBytes = 16 * 1024;
 
-win::Status StatusFromErrno(int error_number) {
-  return win::StatusFromWin32(win::Win32FromErrno(error_number));
+platform::Status StatusFromErrno(int error_number) {
+  return platform::StatusFromWin32(platform::Win32FromErrno(error_number));
 }
 
 // A path with an embedded zero cannot name a file: it is refused, not cut short.
 bool ToNativePath(std::wstring_view path, std::string* native) {
   if (path.find(L'\0') != std::wstring_view::npos) return false;
-  *native = text::WideToUtf8(path);
+  *native = platform::WideToUtf8(path);
   return true;
 }
 
@@ -58,26 +58,26 @@ ssize_t ReadRetrying(int descriptor, char* buffer, std::size_t capacity) {
 
 File::~File() { Close(); }
 
-win::Status File::Open(std::wstring_view path) {
+platform::Status File::Open(std::wstring_view path) {
   Close();
   std::string native;
-  if (!ToNativePath(path, &native)) return win::StatusFromWin32(win::kErrorInvalidName);
+  if (!ToNativePath(path, &native)) return platform::StatusFromWin32(platform::kErrorInvalidName);
   int error_number = 0;
   descriptor_ = OpenRegular(native, &error_number);
-  return descriptor_ < 0 ? StatusFromErrno(error_number) : win::kOk;
+  return descriptor_ < 0 ? StatusFromErrno(error_number) : platform::kOk;
 }
 
-win::Status File::Size(std::uint64_t* size) const {
+platform::Status File::Size(std::uint64_t* size) const {
   struct stat info;
   if (::fstat(descriptor_, &info) != 0) return StatusFromErrno(errno);
   *size = static_cast<std::uint64_t>(info.st_size);
-  return win::kOk;
+  return platform::kOk;
 }
 
-win::Status File::Read(char* buffer, std::size_t capacity, std::size_t* count) {
+platform::Status File::Read(char* buffer, std::size_t capacity, std::size_t* count) {
   const ssize_t got = ReadRetrying(descriptor_, buffer, capacity);
   *count = got > 0 ? static_cast<std::size_t>(got) : 0;
-  return got < 0 ? StatusFromErrno(errno) : win::kOk;
+  return got < 0 ? StatusFromErrno(errno) : platform::kOk;
 }
 
 void File::Close() {
@@ -107,4 +107,4 @@ std::optional<std::string> ReadSmallFile(const std::string& nativePath, std::siz
   return bytes;
 }
 
-}  // namespace file
+}  // namespace platform

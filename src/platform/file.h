@@ -10,7 +10,7 @@
 
 #include "platform/win_error.h"
 
-namespace file {
+namespace platform {
 
 // An open file for reading; closed by the destructor.
 class File {
@@ -24,10 +24,10 @@ class File {
   // a FIFO that has no writer would block for good). A directory is refused with
   // access denied, as the system's file API refuses it; a FIFO, device or socket
   // as a missing file, since only a regular file holds what is to be read.
-  win::Status Open(std::wstring_view path);
-  win::Status Size(std::uint64_t* size) const;
+  platform::Status Open(std::wstring_view path);
+  platform::Status Size(std::uint64_t* size) const;
   // Reads up to `capacity` bytes; `*count` is 0 at the end of the file.
-  win::Status Read(char* buffer, std::size_t capacity, std::size_t* count);
+  platform::Status Read(char* buffer, std::size_t capacity, std::size_t* count);
   void Close();
   bool is_open() const { return descriptor_ >= 0; }
 
@@ -42,4 +42,4 @@ bool IsRegularFile(std::wstring_view path);
 // of them; empty when it is missing, unreadable, not a regular file or larger.
 std::optional<std::string> ReadSmallFile(const std::string& nativePath, std::size_t limit);
 
-}  // namespace file
+}  // namespace platform

@@ -1,6 +1,6 @@
 #include "platform/http.h"
 
-namespace http {
+namespace platform::http {
 
 Session::Session(std::string agent, ConnectionEvents* events)
     : agent_(std::move(agent)), events_(events) {}
@@ -19,4 +19,4 @@ std::string Connection::UrlOf(std::string_view path) const {
   return url;
 }
 
-}  // namespace http
+}  // namespace platform::http

@@ -12,7 +12,7 @@
 #include "platform/http_events.h"
 #include "platform/win_error.h"
 
-namespace http {
+namespace platform::http {
 
 constexpr std::uint16_t kHttpPort = 80;
 constexpr std::uint16_t kHttpsPort = 443;
@@ -64,25 +64,21 @@ class Request {
   Request& operator=(const Request&) = delete;
 
   // Header lines "Name: value", separated by LF or CRLF; call before Start.
-  win::Status AddHeaders(std::string_view block);
+  platform::Status AddHeaders(std::string_view block);
   // Connects and sends the head, announcing a body of `content_length` bytes.
-  win::Status Start(std::uint64_t content_length);
+  platform::Status Start(std::uint64_t content_length);
   // Returns once every byte of the piece has been taken for sending. Writing
   // past the announced length is refused.
-  win::Status Write(std::string_view piece);
+  platform::Status Write(std::string_view piece);
   // Ends the body and reads the reply to its end, for at most kReplyLimit.
-  win::Status End();
+  platform::Status End();
   // Start, Write and End for a body known whole, within kExchangeLimit in all.
-  win::Status Send(std::string_view body);
+  platform::Status Send(std::string_view body);
 
   // 0 until a final reply head has arrived.
   std::uint32_t status_code() const;
-  // The first header of that name (any case), trimmed; empty when absent.
-  std::string HeaderValue(std::string_view name) const;
-  // What has been read of the reply body.
-  const std::string& body() const;
-  // The reply body moved out, so that a large one is not copied; body() is
-  // empty afterwards.
+  // The reply body read, moved out so that a large one is not copied; empty
+  // afterwards.
   std::string TakeBody();
 
  private:
@@ -90,4 +86,4 @@ class Request {
   std::unique_ptr<State> state_;
 };
 
-}  // namespace http
+}  // namespace platform::http

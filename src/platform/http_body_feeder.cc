@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <cstring>
 
-namespace http {
+namespace platform::http {
 
 bool BodyFeeder::Install(CURL* easy) {
   return curl_easy_setopt(easy, CURLOPT_READFUNCTION, &OnRead) == CURLE_OK &&
@@ -42,4 +42,4 @@ std::size_t BodyFeeder::OnRead(char* buffer, std::size_t size, std::size_t count
   return bytes;
 }
 
-}  // namespace http
+}  // namespace platform::http

@@ -8,7 +8,7 @@
 
 #include "platform/curl_handles.h"
 
-namespace http {
+namespace platform::http {
 
 class BodyFeeder {
  public:
@@ -36,4 +36,4 @@ class BodyFeeder {
   bool paused_ = false;
 };
 
-}  // namespace http
+}  // namespace platform::http

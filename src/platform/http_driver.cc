@@ -4,7 +4,7 @@
 
 #include "platform/http_limits.h"
 
-namespace http {
+namespace platform::http {
 namespace {
 
 constexpr long kLowestSpeedBytesPerSecond = 1;
@@ -35,12 +35,12 @@ bool Driver::SetCommonOptions(const std::string& url, const std::string& agent) 
   return ok;
 }
 
-win::Status Driver::Begin() {
+platform::Status Driver::Begin() {
   if (curl_multi_add_handle(multi_.get(), easy_.get()) != CURLM_OK) {
-    return win::StatusFromWin32(win::kErrorInternetInternalError);
+    return platform::StatusFromWin32(platform::kErrorInternetInternalError);
   }
   attached_ = true;
-  return win::kOk;
+  return platform::kOk;
 }
 
 void Driver::Run(const std::function<bool()>& until, const StopPoll& stop) {
@@ -66,8 +66,8 @@ bool Driver::PassedDeadline() {
   return true;
 }
 
-win::Status Driver::result() const {
-  return win::StatusFromWin32(win::Win32FromCurl(code_));
+platform::Status Driver::result() const {
+  return platform::StatusFromWin32(platform::Win32FromCurl(code_));
 }
 
 // Lets libcurl do what it can without waiting.
@@ -103,4 +103,4 @@ void Driver::CollectFinished() {
   }
 }
 
-}  // namespace http
+}  // namespace platform::http

@@ -11,7 +11,7 @@
 #include "platform/curl_handles.h"
 #include "platform/win_error.h"
 
-namespace http {
+namespace platform::http {
 
 class Driver {
  public:
@@ -31,7 +31,7 @@ class Driver {
   // connect and stall limits. An empty agent sends no User-Agent of our own.
   bool SetCommonOptions(const std::string& url, const std::string& agent);
   // Hands the transfer to the multi handle; it runs in the calls of Run.
-  win::Status Begin();
+  platform::Status Begin();
   // Runs the transfer until `until` holds, it has finished, or `stop` holds.
   void Run(const std::function<bool()>& until, const StopPoll& stop = {});
   // Makes a Run blocked in another thread look at its conditions again.
@@ -42,7 +42,7 @@ class Driver {
 
   bool finished() const { return finished_; }
   // The outcome once finished, as a status code.
-  win::Status result() const;
+  platform::Status result() const;
 
  private:
   bool Perform();
@@ -58,4 +58,4 @@ class Driver {
   std::optional<Clock::time_point> deadline_;
 };
 
-}  // namespace http
+}  // namespace platform::http

@@ -5,7 +5,7 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
-namespace http {
+namespace platform::http {
 namespace {
 
 std::string AddressText(const curl_sockaddr& address) {
@@ -93,4 +93,4 @@ std::uint32_t EventRelay::BytesSent() const {
   return static_cast<std::uint32_t>(head + body);
 }
 
-}  // namespace http
+}  // namespace platform::http

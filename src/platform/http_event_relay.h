@@ -8,7 +8,7 @@
 #include "platform/curl_handles.h"
 #include "platform/http_events.h"
 
-namespace http {
+namespace platform::http {
 
 class EventRelay {
  public:
@@ -36,4 +36,4 @@ class EventRelay {
   bool name_resolved_ = false;
 };
 
-}  // namespace http
+}  // namespace platform::http

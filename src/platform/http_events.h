@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <string>
 
-namespace http {
+namespace platform::http {
 
 class ConnectionEvents {
  public:
@@ -29,4 +29,4 @@ class ConnectionEvents {
   ~ConnectionEvents() = default;
 };
 
-}  // namespace http
+}  // namespace platform::http

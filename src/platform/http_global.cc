@@ -4,11 +4,11 @@
 
 #include <mutex>
 
-namespace http {
+namespace platform::http {
 
 void GlobalInit() {
   static std::once_flag once;
   std::call_once(once, [] { curl_global_init(CURL_GLOBAL_DEFAULT); });
 }
 
-}  // namespace http
+}  // namespace platform::http

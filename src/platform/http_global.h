@@ -2,9 +2,9 @@
 // thread can make a request.
 #pragma once
 
-namespace http {
+namespace platform::http {
 
 // Safe to call more than once; only the first call does anything.
 void GlobalInit();
 
-}  // namespace http
+}  // namespace platform::http

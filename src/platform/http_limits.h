@@ -4,7 +4,7 @@
 
 #include <chrono>
 
-namespace http {
+namespace platform::http {
 
 // To connect (name resolution included).
 inline constexpr std::chrono::seconds kConnectLimit{60};
@@ -21,4 +21,4 @@ inline constexpr std::chrono::seconds kReplyLimit{30};
 // to stop, so that a cancel needs no wake-up to be seen promptly.
 inline constexpr std::chrono::milliseconds kStopPollInterval{50};
 
-}  // namespace http
+}  // namespace platform::http

@@ -3,7 +3,7 @@
 #include "platform/http_driver.h"
 #include "platform/http_reply_reader.h"
 
-namespace http {
+namespace platform::http {
 
 void ProbeHandle::Close() {
   if (!closed_.exchange(true)) probe_.Cancel();
@@ -20,7 +20,7 @@ bool Probe::Open(const std::string& url) {
   if (cancelled_.load() || !driver_->ok() || !driver_->SetCommonOptions(url, agent_) ||
       !reader_->Install(driver_->easy()) ||
       curl_easy_setopt(driver_->easy(), CURLOPT_HTTPGET, 1L) != CURLE_OK ||
-      win::Failed(driver_->Begin())) {
+      platform::Failed(driver_->Begin())) {
     return false;
   }
   driver_->Run([this] { return reader_->head_received(); }, [this] { return cancelled_.load(); });
@@ -34,4 +34,4 @@ void Probe::Cancel() {
   driver_->Wakeup();
 }
 
-}  // namespace http
+}  // namespace platform::http

@@ -7,7 +7,7 @@
 #include <memory>
 #include <string>
 
-namespace http {
+namespace platform::http {
 
 class Driver;
 class Probe;
@@ -59,4 +59,4 @@ class Probe {
   ProbeHandle connection_{*this};
 };
 
-}  // namespace http
+}  // namespace platform::http

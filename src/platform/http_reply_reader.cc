@@ -1,31 +1,19 @@
 #include "platform/http_reply_reader.h"
 
-#include <strings.h>
-
 #include <cstdlib>
 
+#include "platform/ascii.h"
 #include "platform/http.h"
 #include "platform/http_event_relay.h"
 
-namespace http {
+namespace platform::http {
 namespace {
-
-std::string_view Trim(std::string_view text) {
-  const std::size_t first = text.find_first_not_of(" \t\r\n");
-  if (first == std::string_view::npos) return {};
-  const std::size_t last = text.find_last_not_of(" \t\r\n");
-  return text.substr(first, last - first + 1);
-}
-
-bool SameName(std::string_view a, std::string_view b) {
-  return a.size() == b.size() && ::strncasecmp(a.data(), b.data(), a.size()) == 0;
-}
 
 // "HTTP/1.1 200 OK" gives 200.
 std::uint32_t StatusOf(std::string_view status_line) {
   const std::size_t space = status_line.find(' ');
   if (space == std::string_view::npos) return 0;
-  const std::string digits(Trim(status_line.substr(space + 1, 4)));
+  const std::string digits(platform::Trim(status_line.substr(space + 1, 4)));
   return static_cast<std::uint32_t>(std::strtoul(digits.c_str(), nullptr, 10));
 }
 
@@ -42,13 +30,6 @@ bool ReplyReader::Install(CURL* easy) {
          curl_easy_setopt(easy, CURLOPT_WRITEFUNCTION, &OnBody) == CURLE_OK &&
          curl_easy_setopt(easy, CURLOPT_WRITEDATA, this) == CURLE_OK &&
          curl_easy_setopt(easy, CURLOPT_MAXFILESIZE_LARGE, most) == CURLE_OK;
-}
-
-std::string ReplyReader::HeaderValue(std::string_view name) const {
-  for (const auto& [key, value] : headers_) {
-    if (SameName(key, name)) return value;
-  }
-  return {};
 }
 
 std::size_t ReplyReader::OnHeader(char* data, std::size_t size, std::size_t count, void* self) {
@@ -72,21 +53,15 @@ void ReplyReader::TakeHeadLine(std::string_view line) {
   }
   if (line.substr(0, 5) == "HTTP/") {  // a new head: an interim one is forgotten
     status_code_ = StatusOf(line);
-    headers_.clear();
     head_bytes_ = 0;
   }
   head_bytes_ += static_cast<std::uint32_t>(line.size());
-  if (Trim(line).empty()) {
+  if (platform::Trim(line).empty()) {
     if (status_code_ >= 200 && !head_received_) {
       head_received_ = true;
       if (relay_) relay_->ResponseHeadEnded(head_bytes_);
     }
-    return;
   }
-  const std::size_t colon = line.find(':');
-  if (colon == std::string_view::npos) return;
-  headers_.emplace_back(std::string(Trim(line.substr(0, colon))),
-                        std::string(Trim(line.substr(colon + 1))));
 }
 
-}  // namespace http
+}  // namespace platform::http

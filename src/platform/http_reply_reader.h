@@ -1,4 +1,4 @@
-// Collects a reply: the status and headers of its final head and its body, which
+// Collects a reply: the status of its final head and its body, which
 // may not grow past the bound of http::kMaxReplyBytes.
 #pragma once
 
@@ -6,11 +6,10 @@
 #include <string>
 #include <string_view>
 #include <utility>
-#include <vector>
 
 #include "platform/curl_handles.h"
 
-namespace http {
+namespace platform::http {
 
 class EventRelay;
 
@@ -23,8 +22,6 @@ class ReplyReader {
   // True once a final (non-1xx) head has ended.
   bool head_received() const { return head_received_; }
   std::uint32_t status_code() const { return head_received_ ? status_code_ : 0; }
-  std::string HeaderValue(std::string_view name) const;
-  const std::string& body() const { return body_; }
   std::string TakeBody() { return std::move(body_); }
 
  private:
@@ -37,8 +34,7 @@ class ReplyReader {
   bool head_received_ = false;
   std::uint32_t status_code_ = 0;
   std::uint32_t head_bytes_ = 0;
-  std::vector<std::pair<std::string, std::string>> headers_;
   std::string body_;
 };
 
-}  // namespace http
+}  // namespace platform::http

@@ -1,7 +1,7 @@
 #include <algorithm>
-#include <cctype>
 #include <string>
 
+#include "platform/ascii.h"
 #include "platform/http.h"
 #include "platform/http_body_feeder.h"
 #include "platform/http_driver.h"
@@ -9,7 +9,7 @@
 #include "platform/http_limits.h"
 #include "platform/http_reply_reader.h"
 
-namespace http {
+namespace platform::http {
 namespace {
 
 constexpr std::string_view kPost = "POST";
@@ -19,7 +19,7 @@ constexpr std::string_view kPost = "POST";
 constexpr std::uint64_t kSmallestUploadBuffer = 64 * 1024;
 constexpr std::uint64_t kLargestUploadBuffer = 2 * 1024 * 1024;
 
-win::Status Fail(std::uint32_t code) { return win::StatusFromWin32(code); }
+platform::Status Fail(std::uint32_t code) { return platform::StatusFromWin32(code); }
 
 std::string_view NameOf(std::string_view line) { return line.substr(0, line.find(':')); }
 
@@ -29,13 +29,7 @@ long UploadBufferSize(std::uint64_t content_length) {
 }
 
 bool IsContentType(std::string_view line) {
-  constexpr std::string_view kName = "content-type";
-  const std::string_view name = NameOf(line);
-  if (name.size() != kName.size()) return false;
-  for (std::size_t i = 0; i < name.size(); ++i) {
-    if (std::tolower(static_cast<unsigned char>(name[i])) != kName[i]) return false;
-  }
-  return true;
+  return platform::EqualIgnoringCase(NameOf(line), "content-type");
 }
 
 }  // namespace
@@ -52,10 +46,10 @@ class Request::State {
         relay_(events_, connection.host()),
         reader_(&relay_) {}
 
-  win::Status AddHeaders(std::string_view block);
-  win::Status Start(std::uint64_t content_length);
-  win::Status Write(std::string_view piece);
-  win::Status End();
+  platform::Status AddHeaders(std::string_view block);
+  platform::Status Start(std::uint64_t content_length);
+  platform::Status Write(std::string_view piece);
+  platform::Status End();
   void LimitTo(std::chrono::seconds seconds) { driver_.LimitTo(seconds); }
 
   const ReplyReader& reader() const { return reader_; }
@@ -69,7 +63,7 @@ class Request::State {
   void Run(const std::function<bool()>& until);
   bool CancelRequested() const { return events_ && events_->IsCancelled(); }
   // What a transfer that stopped early reports.
-  win::Status Stopped() const;
+  platform::Status Stopped() const;
 
   std::string verb_;
   std::string url_;
@@ -85,50 +79,50 @@ class Request::State {
   Driver driver_;
 };
 
-win::Status Request::State::AddHeaders(std::string_view block) {
-  if (started_) return Fail(win::kErrorInvalidParameter);
+platform::Status Request::State::AddHeaders(std::string_view block) {
+  if (started_) return Fail(platform::kErrorInvalidParameter);
   while (!block.empty()) {
     const std::size_t end = block.find('\n');
     std::string line(block.substr(0, end));
     block = end == std::string_view::npos ? std::string_view() : block.substr(end + 1);
     if (!line.empty() && line.back() == '\r') line.pop_back();
     if (line.empty()) continue;
-    if (!AddHeaderLine(line)) return Fail(win::kErrorNotEnoughMemory);
+    if (!AddHeaderLine(line)) return Fail(platform::kErrorNotEnoughMemory);
     names_content_type_ = names_content_type_ || IsContentType(line);
   }
-  return win::kOk;
+  return platform::kOk;
 }
 
-win::Status Request::State::Start(std::uint64_t content_length) {
-  if (started_ || (!is_post() && content_length != 0)) return Fail(win::kErrorInvalidParameter);
+platform::Status Request::State::Start(std::uint64_t content_length) {
+  if (started_ || (!is_post() && content_length != 0)) return Fail(platform::kErrorInvalidParameter);
   started_ = true;
   announced_ = content_length;
-  if (!driver_.ok() || !Configure(content_length)) return Fail(win::kErrorNotEnoughMemory);
-  const win::Status begun = driver_.Begin();
-  if (win::Failed(begun) || content_length == 0) return begun;
+  if (!driver_.ok() || !Configure(content_length)) return Fail(platform::kErrorNotEnoughMemory);
+  const platform::Status begun = driver_.Begin();
+  if (platform::Failed(begun) || content_length == 0) return begun;
   // Run until libcurl has connected, sent the head and asks for the body.
   Run([this] { return feeder_.waiting(); });
   if (driver_.finished()) return driver_.result();
-  return feeder_.waiting() ? win::kOk : Stopped();
+  return feeder_.waiting() ? platform::kOk : Stopped();
 }
 
-win::Status Request::State::Write(std::string_view piece) {
+platform::Status Request::State::Write(std::string_view piece) {
   if (!started_ || !is_post() || feeder_.handed_over() + piece.size() > announced_) {
-    return Fail(win::kErrorInvalidParameter);
+    return Fail(platform::kErrorInvalidParameter);
   }
-  if (piece.empty()) return win::kOk;
+  if (piece.empty()) return platform::kOk;
   feeder_.Offer(piece);
   feeder_.Resume(driver_.easy());
   Run([this] {
     return feeder_.taken() && (feeder_.waiting() || feeder_.handed_over() == announced_);
   });
-  return feeder_.taken() ? win::kOk : Stopped();
+  return feeder_.taken() ? platform::kOk : Stopped();
 }
 
-win::Status Request::State::End() {
+platform::Status Request::State::End() {
   if (!started_) {
-    const win::Status started = Start(0);
-    if (win::Failed(started)) return started;
+    const platform::Status started = Start(0);
+    if (platform::Failed(started)) return started;
   }
   feeder_.Finish();
   feeder_.Resume(driver_.easy());
@@ -165,10 +159,10 @@ void Request::State::Run(const std::function<bool()>& until) {
   driver_.Run(until, [this] { return CancelRequested(); });
 }
 
-win::Status Request::State::Stopped() const {
-  if (driver_.finished() && win::Failed(driver_.result())) return driver_.result();
-  if (CancelRequested()) return Fail(win::kErrorInternetOperationCancelled);
-  return Fail(win::kErrorInternetConnectionAborted);
+platform::Status Request::State::Stopped() const {
+  if (driver_.finished() && platform::Failed(driver_.result())) return driver_.result();
+  if (CancelRequested()) return Fail(platform::kErrorInternetOperationCancelled);
+  return Fail(platform::kErrorInternetConnectionAborted);
 }
 
 Request::Request(const Connection& connection, std::string verb, std::string path)
@@ -176,27 +170,21 @@ Request::Request(const Connection& connection, std::string verb, std::string pat
 
 Request::~Request() = default;
 
-win::Status Request::AddHeaders(std::string_view block) { return state_->AddHeaders(block); }
-win::Status Request::Start(std::uint64_t content_length) { return state_->Start(content_length); }
-win::Status Request::Write(std::string_view piece) { return state_->Write(piece); }
-win::Status Request::End() { return state_->End(); }
+platform::Status Request::AddHeaders(std::string_view block) { return state_->AddHeaders(block); }
+platform::Status Request::Start(std::uint64_t content_length) { return state_->Start(content_length); }
+platform::Status Request::Write(std::string_view piece) { return state_->Write(piece); }
+platform::Status Request::End() { return state_->End(); }
 
-win::Status Request::Send(std::string_view body) {
+platform::Status Request::Send(std::string_view body) {
   state_->LimitTo(kExchangeLimit);
-  win::Status status = Start(body.size());
-  if (!win::Failed(status) && !body.empty()) status = Write(body);
-  if (!win::Failed(status)) status = End();
+  platform::Status status = Start(body.size());
+  if (!platform::Failed(status) && !body.empty()) status = Write(body);
+  if (!platform::Failed(status)) status = End();
   return status;
 }
 
 std::uint32_t Request::status_code() const { return state_->reader().status_code(); }
 
-std::string Request::HeaderValue(std::string_view name) const {
-  return state_->reader().HeaderValue(name);
-}
-
-const std::string& Request::body() const { return state_->reader().body(); }
-
 std::string Request::TakeBody() { return state_->reader().TakeBody(); }
 
-}  // namespace http
+}  // namespace platform::http

@@ -4,7 +4,7 @@
 
 #include <cstdint>
 
-namespace memory {
+namespace platform {
 namespace {
 
 constexpr std::size_t kHugePage = 2 * 1024 * 1024;
@@ -37,4 +37,4 @@ LargeBuffer::~LargeBuffer() {
   if (data_ != nullptr) ::munmap(data_, mapped_);
 }
 
-}  // namespace memory
+}  // namespace platform

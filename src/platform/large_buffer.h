@@ -6,7 +6,7 @@
 
 #include <cstddef>
 
-namespace memory {
+namespace platform {
 
 class LargeBuffer {
  public:
@@ -23,4 +23,4 @@ class LargeBuffer {
   std::size_t mapped_ = 0;
 };
 
-}  // namespace memory
+}  // namespace platform

@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <iterator>
 
-namespace ui {
+namespace platform {
 
 std::shared_ptr<MessageQueue> MessageQueue::ForCurrentThread() {
   thread_local std::shared_ptr<MessageQueue> queue;
@@ -103,4 +103,4 @@ void MessageQueue::Drop(std::deque<Entry>& entries) {
   entries.clear();
 }
 
-}  // namespace ui
+}  // namespace platform

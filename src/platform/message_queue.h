@@ -20,7 +20,7 @@
 
 #include "platform/window.h"
 
-namespace ui {
+namespace platform {
 
 class MessageQueue {
  public:
@@ -76,4 +76,4 @@ class MessageQueue {
   std::condition_variable dispatchEnded_;
 };
 
-}  // namespace ui
+}  // namespace platform

@@ -4,6 +4,8 @@
 
 #include "platform/blocking_scope.h"
 
+namespace platform {
+
 OperationGate::Pass::Pass(OperationGate& gate) : state_(gate.state_), entered_(Enter(*state_)) {}
 
 OperationGate::Pass::~Pass() {
@@ -42,3 +44,5 @@ bool OperationGate::OthersInside() const {
   return std::any_of(state_->inside.begin(), state_->inside.end(),
                      [me](std::thread::id id) { return id != me; });
 }
+
+}  // namespace platform

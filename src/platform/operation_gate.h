@@ -9,6 +9,8 @@
 #include <thread>
 #include <vector>
 
+namespace platform {
+
 class OperationGate {
   struct State;
 
@@ -52,3 +54,5 @@ class OperationGate {
 
   const std::shared_ptr<State> state_;
 };
+
+}  // namespace platform

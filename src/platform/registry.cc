@@ -2,17 +2,17 @@
 
 #include <cstdlib>
 
+#include "platform/ascii.h"
 #include "platform/file.h"
 #include "platform/text.h"
 
-namespace registry {
+namespace platform {
 namespace {
 
 constexpr std::wstring_view kLocalMachinePrefix = L"HKEY_LOCAL_MACHINE\\";
 constexpr std::wstring_view kHeaders[] = {L"Windows Registry Editor Version 5.00", L"REGEDIT4"};
 constexpr std::wstring_view kDwordTag = L"dword:";
 constexpr std::wstring_view kHexTag = L"hex";
-constexpr std::wstring_view kWhitespace = L" \t\r";
 constexpr std::string_view kUtf16LeMark = "\xFF\xFE";
 constexpr std::string_view kUtf8Mark = "\xEF\xBB\xBF";
 constexpr wchar_t kReplacement = 0xFFFD;
@@ -24,19 +24,7 @@ using Bytes = std::vector<std::uint8_t>;
 using Values = std::map<std::wstring, Bytes>;
 
 // Registry names ignore the case of ASCII letters.
-std::wstring Fold(std::wstring_view name) {
-  std::wstring folded(name);
-  for (wchar_t& c : folded) {
-    if (c >= L'A' && c <= L'Z') c = c - L'A' + L'a';
-  }
-  return folded;
-}
-
-std::wstring_view Trim(std::wstring_view s) {
-  const auto first = s.find_first_not_of(kWhitespace);
-  if (first == std::wstring_view::npos) return {};
-  return s.substr(first, s.find_last_not_of(kWhitespace) - first + 1);
-}
+std::wstring Fold(std::wstring_view name) { return platform::Lowered(name); }
 
 bool StartsWith(std::wstring_view s, std::wstring_view prefix) {
   return s.substr(0, prefix.size()) == prefix;
@@ -88,7 +76,7 @@ std::wstring DecodeFile(std::string_view bytes) {
     return DecodeUtf16Le(bytes.substr(kUtf16LeMark.size()));
   }
   if (bytes.substr(0, kUtf8Mark.size()) == kUtf8Mark) bytes.remove_prefix(kUtf8Mark.size());
-  return text::Utf8ToWide(bytes);
+  return platform::Utf8ToWide(bytes);
 }
 
 // Trimmed lines, with hex data continued over several lines ("\" at the end) joined.
@@ -97,7 +85,7 @@ std::vector<std::wstring> LogicalLines(std::wstring_view text) {
   bool continues = false;
   while (!text.empty()) {
     const auto end = text.find(L'\n');
-    std::wstring_view line = Trim(text.substr(0, end));
+    std::wstring_view line = platform::Trim(text.substr(0, end));
     text.remove_prefix(end == std::wstring_view::npos ? text.size() : end + 1);
     const bool continuesNext = !line.empty() && line.back() == L'\\';
     if (continuesNext) line.remove_suffix(1);
@@ -111,21 +99,14 @@ std::vector<std::wstring> LogicalLines(std::wstring_view text) {
   return lines;
 }
 
-int HexDigit(wchar_t c) {
-  if (c >= L'0' && c <= L'9') return c - L'0';
-  if (c >= L'a' && c <= L'f') return c - L'a' + 10;
-  if (c >= L'A' && c <= L'F') return c - L'A' + 10;
-  return -1;
-}
-
 // A hexadecimal number of 1 to maxDigits digits, the whole of `digits`.
 std::optional<std::uint32_t> ParseHex(std::wstring_view digits, std::size_t maxDigits) {
   if (digits.empty() || digits.size() > maxDigits) return std::nullopt;
   std::uint32_t value = 0;
   for (wchar_t c : digits) {
-    const int d = HexDigit(c);
-    if (d < 0) return std::nullopt;
-    value = (value << 4) | static_cast<std::uint32_t>(d);
+    const auto digit = platform::HexDigitValue(c);
+    if (!digit) return std::nullopt;
+    value = (value << 4) | *digit;
   }
   return value;
 }
@@ -166,9 +147,9 @@ std::optional<Bytes> ParseHexList(std::wstring_view rest) {
   if (rest.empty() || rest.front() != L':') return std::nullopt;
   rest.remove_prefix(1);
   Bytes out;
-  while (!Trim(rest).empty()) {
+  while (!platform::Trim(rest).empty()) {
     const auto comma = rest.find(L',');
-    const auto byte = ParseHex(Trim(rest.substr(0, comma)), 2);
+    const auto byte = ParseHex(platform::Trim(rest.substr(0, comma)), 2);
     if (!byte) return std::nullopt;
     out.push_back(static_cast<std::uint8_t>(*byte));
     rest.remove_prefix(comma == std::wstring_view::npos ? rest.size() : comma + 1);
@@ -179,11 +160,11 @@ std::optional<Bytes> ParseHexList(std::wstring_view rest) {
 std::optional<Bytes> ParseData(std::wstring_view data) {
   if (StartsWith(data, L"\"")) {
     const auto text = ReadQuoted(data);
-    if (!text || !Trim(data).empty()) return std::nullopt;
+    if (!text || !platform::Trim(data).empty()) return std::nullopt;
     return EncodeUtf16Le(*text);
   }
   const std::wstring folded = Fold(data);
-  if (StartsWith(folded, kDwordTag)) return ParseDword(Trim(data.substr(kDwordTag.size())));
+  if (StartsWith(folded, kDwordTag)) return ParseDword(platform::Trim(data.substr(kDwordTag.size())));
   if (StartsWith(folded, kHexTag)) return ParseHexList(data.substr(kHexTag.size()));
   return std::nullopt;
 }
@@ -198,9 +179,9 @@ void ApplyValueLine(std::wstring_view line, Values& values) {
   } else {
     name = ReadQuoted(line);
   }
-  line = Trim(line);
+  line = platform::Trim(line);
   if (!name || line.empty() || line.front() != L'=') return;
-  const std::wstring_view data = Trim(line.substr(1));
+  const std::wstring_view data = platform::Trim(line.substr(1));
   if (data == L"-") {
     values.erase(Fold(*name));
   } else if (auto bytes = ParseData(data)) {
@@ -220,7 +201,7 @@ std::wstring SectionKey(std::wstring_view line) {
   line.remove_prefix(1);
   const auto close = line.rfind(L']');
   if (close == std::wstring_view::npos || StartsWith(line, L"-")) return {};
-  return Fold(Trim(line.substr(0, close)));
+  return Fold(platform::Trim(line.substr(0, close)));
 }
 
 }  // namespace
@@ -230,13 +211,13 @@ std::string HivePath() {
   return path && *path ? path : kDefaultHivePath;
 }
 
-std::optional<Key> Key::OpenLocalMachine(std::wstring_view subkey) {
-  const auto bytes = file::ReadSmallFile(HivePath(), kHiveFileLimit);
+std::optional<RegistryKey> RegistryKey::OpenLocalMachine(std::wstring_view subkey) {
+  const auto bytes = platform::ReadSmallFile(HivePath(), kHiveFileLimit);
   if (!bytes) return std::nullopt;
   return OpenInHiveFile(*bytes, subkey);
 }
 
-std::optional<Key> Key::OpenInHiveFile(std::string_view fileBytes, std::wstring_view subkey) {
+std::optional<RegistryKey> RegistryKey::OpenInHiveFile(std::string_view fileBytes, std::wstring_view subkey) {
   const std::vector<std::wstring> lines = LogicalLines(DecodeFile(fileBytes));
   auto line = lines.begin();
   while (line != lines.end() && line->empty()) ++line;
@@ -244,7 +225,7 @@ std::optional<Key> Key::OpenInHiveFile(std::string_view fileBytes, std::wstring_
 
   const std::wstring wanted = Fold(std::wstring(kLocalMachinePrefix).append(subkey));
   const std::wstring descendantPrefix = wanted + L"\\";
-  Key key;
+  RegistryKey key;
   bool exists = false;  // a section of the key itself or of one of its subkeys
   bool inKey = false;
   for (++line; line != lines.end(); ++line) {
@@ -261,7 +242,7 @@ std::optional<Key> Key::OpenInHiveFile(std::string_view fileBytes, std::wstring_
   return key;
 }
 
-std::optional<std::uint32_t> Key::ReadNumber(std::wstring_view name) const {
+std::optional<std::uint32_t> RegistryKey::ReadNumber(std::wstring_view name) const {
   const auto found = values_.find(Fold(name));
   if (found == values_.end()) return std::nullopt;
   std::uint32_t number = 0;
@@ -270,4 +251,4 @@ std::optional<std::uint32_t> Key::ReadNumber(std::wstring_view name) const {
   return number;
 }
 
-}  // namespace registry
+}  // namespace platform

@@ -18,21 +18,21 @@
 #include <string_view>
 #include <vector>
 
-namespace registry {
+namespace platform {
 
 inline constexpr char kHivePathVariable[] = "PYUPLOADER_REGISTRY";
 inline constexpr char kDefaultHivePath[] = "/etc/pyuploader/registry.reg";
 
 // The values of one key, read once when the key is opened.
-class Key {
+class RegistryKey {
  public:
   // Opens `subkey` (e.g. L"SOFTWARE\\Maker\\Product") of the local-machine hive.
   // Empty when the hive file cannot be read or holds no such key. Only a regular
   // file of at most 1 MiB is read; anything else cannot be.
-  static std::optional<Key> OpenLocalMachine(std::wstring_view subkey);
+  static std::optional<RegistryKey> OpenLocalMachine(std::wstring_view subkey);
 
   // The same, from the bytes of a hive file.
-  static std::optional<Key> OpenInHiveFile(std::string_view fileBytes, std::wstring_view subkey);
+  static std::optional<RegistryKey> OpenInHiveFile(std::string_view fileBytes, std::wstring_view subkey);
 
   // The value's data read as a 32-bit number whatever its type: the first four
   // bytes, little-endian, zero-padded when shorter. Empty when there is no such value.
@@ -45,4 +45,4 @@ class Key {
 // The hive file in use: PYUPLOADER_REGISTRY when set and not empty, else the default.
 std::string HivePath();
 
-}  // namespace registry
+}  // namespace platform

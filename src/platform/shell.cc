@@ -5,17 +5,17 @@
 #include <sys/types.h>
 #include <sys/wait.h>
 
-#include <cctype>
 #include <cstdlib>
 #include <string>
 #include <thread>
 #include <vector>
 
+#include "platform/ascii.h"
 #include "platform/text.h"
 
 extern char** environ;
 
-namespace shell {
+namespace platform {
 namespace {
 
 constexpr std::string_view kSchemes[] = {"http://", "https://"};
@@ -26,12 +26,7 @@ bool IsWebLink(std::string_view link) {
     if (static_cast<unsigned char>(c) < 0x20 || c == 0x7F) return false;
   }
   for (std::string_view scheme : kSchemes) {
-    if (link.size() <= scheme.size()) continue;
-    bool same = true;
-    for (size_t i = 0; i < scheme.size() && same; ++i) {
-      same = std::tolower(static_cast<unsigned char>(link[i])) == scheme[i];
-    }
-    if (same) return true;
+    if (link.size() > scheme.size() && platform::StartsWithIgnoringCase(link, scheme)) return true;
   }
   return false;
 }
@@ -114,7 +109,7 @@ bool Spawn(const std::vector<std::string>& argv) {
 }  // namespace
 
 bool OpenLink(std::wstring_view wide_link) {
-  const std::string link = text::WideToUtf8(wide_link);
+  const std::string link = platform::WideToUtf8(wide_link);
   if (!IsWebLink(link)) return false;
   if (const char* browsers = std::getenv("BROWSER")) {
     for (const std::string& command : Split(browsers, ":")) {
@@ -124,4 +119,4 @@ bool OpenLink(std::wstring_view wide_link) {
   return Spawn({kFallbackOpener, link});
 }
 
-}  // namespace shell
+}  // namespace platform

@@ -3,7 +3,7 @@
 
 #include <string_view>
 
-namespace shell {
+namespace platform {
 
 // Hands an http or https link to the user's handler: each command of $BROWSER
 // in turn (colon-separated; "%s" in a command's words becomes the link, "%%" a
@@ -13,4 +13,4 @@ namespace shell {
 // holding control characters, and when no handler could be started.
 bool OpenLink(std::wstring_view link);
 
-}  // namespace shell
+}  // namespace platform

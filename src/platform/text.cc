@@ -2,7 +2,7 @@
 
 #include <cstdint>
 
-namespace text {
+namespace platform {
 namespace {
 
 constexpr char32_t kReplacement = 0xFFFD;
@@ -80,4 +80,4 @@ std::string WideToUtf8(std::wstring_view wide) {
   return out;
 }
 
-}  // namespace text
+}  // namespace platform

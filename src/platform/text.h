@@ -5,8 +5,9 @@
 
 #include <string>
 #include <string_view>
+#include <utility>
 
-namespace text {
+namespace platform {
 
 std::wstring Utf8ToWide(std::string_view bytes);
 std::string WideToUtf8(std::wstring_view wide);
@@ -14,9 +15,14 @@ std::string WideToUtf8(std::wstring_view wide);
 // reads them; bytes that are valid UTF-8 already are returned as they are.
 std::string ValidUtf8(std::string bytes);
 
+// The ANSI code page, the narrow text of the system's interfaces, is UTF-8 here.
+inline std::string WideToAnsi(std::wstring_view wide) { return WideToUtf8(wide); }
+// ANSI bytes as valid UTF-8 text.
+inline std::string AnsiToUtf8(std::string bytes) { return ValidUtf8(std::move(bytes)); }
+
 // Length of a zero-terminated wide string that may be null (0 for null).
 inline std::wstring_view WideView(const wchar_t* s) {
   return s ? std::wstring_view(s) : std::wstring_view();
 }
 
-}  // namespace text
+}  // namespace platform

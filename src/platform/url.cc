@@ -4,7 +4,7 @@
 
 #include "platform/curl_handles.h"
 
-namespace url {
+namespace platform {
 namespace {
 
 // Reads one part; a part the URL lacks reads as empty text.
@@ -30,16 +30,16 @@ bool HostHasEscape(std::string_view authority) {
   return !host.empty() && host.front() != '[' && host.find('%') != std::string_view::npos;
 }
 
-bool Fits(const std::string& component) { return component.size() < kComponentCapacity; }
+bool Fits(const std::string& component) { return component.size() < kUrlComponentCapacity; }
 
-bool AllFit(const Components& c) {
+bool AllFit(const UrlComponents& c) {
   return Fits(c.scheme) && Fits(c.host) && Fits(c.user) && Fits(c.password) && Fits(c.path) &&
          Fits(c.extra);
 }
 
 }  // namespace
 
-bool Split(std::string_view text, Components* components) {
+bool SplitUrl(std::string_view text, UrlComponents* components) {
   if (text.find('\0') != std::string_view::npos) return false;
   // Only absolute URLs with an authority: "scheme://host...". libcurl would
   // read "http:///p" as the host "p"; the system's parser finds no host there.
@@ -57,7 +57,7 @@ bool Split(std::string_view text, Components* components) {
   if (curl_url_set(handle.get(), CURLUPART_URL, whole.c_str(), CURLU_PATH_AS_IS) != CURLUE_OK) {
     return false;
   }
-  Components parts;
+  UrlComponents parts;
   parts.scheme = std::string(text.substr(0, colon));
   std::string port;
   if (!GetPart(handle.get(), CURLUPART_HOST, 0, &parts.host) ||
@@ -75,4 +75,4 @@ bool Split(std::string_view text, Components* components) {
   return true;
 }
 
-}  // namespace url
+}  // namespace platform

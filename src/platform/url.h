@@ -4,12 +4,12 @@
 #include <string>
 #include <string_view>
 
-namespace url {
+namespace platform {
 
 // Every component must fit the system's 260-byte buffers, terminator included.
-constexpr std::size_t kComponentCapacity = 260;
+constexpr std::size_t kUrlComponentCapacity = 260;
 
-struct Components {
+struct UrlComponents {
   std::string scheme;    // as written, case kept
   std::string host;
   std::string user;
@@ -20,6 +20,6 @@ struct Components {
 };
 
 // False when the URL cannot be parsed or a component does not fit its buffer.
-bool Split(std::string_view text, Components* components);
+bool SplitUrl(std::string_view text, UrlComponents* components);
 
-}  // namespace url
+}  // namespace platform

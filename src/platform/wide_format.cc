@@ -7,7 +7,7 @@
 #include <cwchar>
 #include <string_view>
 
-namespace wide_format {
+namespace platform {
 namespace {
 
 constexpr std::wstring_view kFlagsAndWidth = L"-+ #0'*.0123456789";
@@ -92,4 +92,4 @@ std::size_t FormatCut(wchar_t* buffer, std::size_t capacity, const wchar_t* form
   return length;
 }
 
-}  // namespace wide_format
+}  // namespace platform

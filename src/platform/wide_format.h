@@ -9,7 +9,7 @@
 #include <cstddef>
 #include <string>
 
-namespace wide_format {
+namespace platform {
 
 // The glibc format that means what the Windows-convention `format` means.
 std::wstring TranslateFormat(const wchar_t* format);
@@ -19,4 +19,4 @@ std::wstring TranslateFormat(const wchar_t* format);
 // narrow argument that is not UTF-8 ends the text where it stands.
 std::size_t FormatCut(wchar_t* buffer, std::size_t capacity, const wchar_t* format, std::va_list args);
 
-}  // namespace wide_format
+}  // namespace platform

@@ -4,7 +4,7 @@
 
 #include <cerrno>
 
-namespace win {
+namespace platform {
 
 Status StatusFromWin32(std::uint32_t code) {
   if (static_cast<std::int32_t>(code) <= 0) return static_cast<Status>(code);
@@ -58,4 +58,4 @@ std::uint32_t Win32FromCurl(int curl_code) {
   }
 }
 
-}  // namespace win
+}  // namespace platform

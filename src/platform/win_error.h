@@ -4,7 +4,7 @@
 
 #include <cstdint>
 
-namespace win {
+namespace platform {
 
 // A 32-bit HRESULT: 0 is success, negative values are failures.
 using Status = std::int32_t;
@@ -48,4 +48,4 @@ std::uint32_t Win32FromErrno(int error_number);
 // The Windows (WinInet) error code nearest in meaning to a libcurl CURLcode.
 std::uint32_t Win32FromCurl(int curl_code);
 
-}  // namespace win
+}  // namespace platform

@@ -5,7 +5,7 @@
 
 #include "platform/message_queue.h"
 
-namespace ui {
+namespace platform {
 namespace {
 
 // The process-wide window classes: name to procedure.
@@ -57,4 +57,4 @@ std::intptr_t Window::Dispatch(std::uint32_t message, std::uintptr_t wparam, std
   return procedure_(*this, message, wparam, lparam);
 }
 
-}  // namespace ui
+}  // namespace platform

@@ -9,7 +9,7 @@
 #include <memory>
 #include <string>
 
-namespace ui {
+namespace platform {
 
 class MessageQueue;
 class Window;
@@ -64,4 +64,4 @@ class Window {
   void* userData_ = nullptr;
 };
 
-}  // namespace ui
+}  // namespace platform

@@ -4,9 +4,10 @@
 
 #include <algorithm>
 
+#include "platform/ascii.h"
 #include "platform/text.h"
 
-namespace xml {
+namespace platform::xml {
 namespace {
 
 // Comments and processing instructions stay in the tree so that a child walk
@@ -37,7 +38,7 @@ std::size_t MostTreeBytes(std::string_view text) {
   return nodes * kNodeRecordBytes + equals * kAttributeRecordBytes;
 }
 
-std::wstring Wide(const char* utf8) { return text::Utf8ToWide(utf8); }
+std::wstring Wide(const char* utf8) { return platform::Utf8ToWide(utf8); }
 
 bool IsText(pugi::xml_node node) {
   return node.type() == pugi::node_pcdata || node.type() == pugi::node_cdata;
@@ -124,7 +125,7 @@ std::wstring Node::Name() const {
 std::wstring Node::Text() const {
   std::string out;
   AppendText(pugi::xml_node(node_), out);
-  return text::Utf8ToWide(out);
+  return platform::Utf8ToWide(out);
 }
 
 std::wstring Node::Attribute(std::string_view name) const {
@@ -145,13 +146,13 @@ std::vector<Node> Node::Children() const {
 Document::Document() : document_(std::make_unique<pugi::xml_document>()) {}
 
 Document::Document(std::wstring_view text)
-    : Document(text::WideToUtf8(text.substr(0, text.find(L'\0')))) {}
+    : Document(platform::WideToUtf8(platform::UpToNul(text))) {}
 
 Document::Document(std::string utf8)
     : text_(std::make_unique<std::string>(std::move(utf8))),
       document_(std::make_unique<pugi::xml_document>()) {
   std::string& text = *text_;
-  text.resize(std::min(text.size(), text.find('\0')));  // the reply text ends at its terminator
+  text.resize(platform::UpToNul(text).size());  // the reply text ends at its terminator
   if (MostTreeBytes(text) > kMaxTreeBytes) return;
   const pugi::xml_parse_result result = document_->load_buffer_inplace(
       text.data(), text.size(), kParseOptions, pugi::encoding_utf8);
@@ -176,4 +177,4 @@ Lookup Document::NodeText(std::string_view path) const {
 
 Node Document::Top() const { return Node(document_->internal_object()); }
 
-}  // namespace xml
+}  // namespace platform::xml

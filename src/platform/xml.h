@@ -15,7 +15,7 @@ class xml_document;
 struct xml_node_struct;
 }  // namespace pugi
 
-namespace xml {
+namespace platform::xml {
 
 // DOM node type numbers, so that callers can name them as the service's DOM does.
 enum class NodeType {
@@ -93,4 +93,4 @@ class Document {
 // largest reply, so that reading one takes a few times its size at most.
 inline constexpr std::size_t kMaxTreeBytes = 64u << 20;
 
-}  // namespace xml
+}  // namespace platform::xml

@@ -5,6 +5,8 @@
 #include "diag/trace.h"
 #include "platform/text.h"
 
+namespace service {
+
 namespace {
 
 constexpr char kTraceName[] = "OBLoginData";
@@ -19,19 +21,19 @@ OBLoginData::OBLoginData(const wchar_t* version, const wchar_t* versionType, con
       m_hRequest(nullptr),
       m_bServerReachable(0),
       m_bLoggedIn(0),
-      m_strVersion(text::WideView(version)),
-      m_strVersionType(text::WideView(versionType)),
-      m_strUuid(text::WideView(uuid)),
-      m_hosts(ServiceHosts::FromEnvironment()) {
+      m_strVersion(platform::WideView(version)),
+      m_strVersionType(platform::WideView(versionType)),
+      m_strUuid(platform::WideView(uuid)),
+      hosts_(ServiceHosts::FromEnvironment()) {
   m_strSignUpURL = DefaultLink(kSignUpPath);
   m_strForgetPasswordURL = DefaultLink(kForgetPasswordPath);
-  TraceSetPrefix(kTraceName);
+  diag::TraceSetPrefix(kTraceName);
   std::memset(m_szChkServerUrl, 0, sizeof m_szChkServerUrl);
-  TraceMessage(L"KRV version = %s", m_strVersion.c_str());
-  TraceMessage(L"KRV versionType = %s", m_strVersionType.c_str());
+  diag::TraceMessage(L"KRV version = %s", m_strVersion.c_str());
+  diag::TraceMessage(L"KRV versionType = %s", m_strVersionType.c_str());
 }
 
-OBLoginData::~OBLoginData() { m_runningOperations.Close(); }
+OBLoginData::~OBLoginData() { runningOperations_.Close(); }
 
 std::wstring OBLoginData::GetUserName() const { return m_strUserName; }
 
@@ -56,5 +58,7 @@ void OBLoginData::SetUserName(const std::wstring& name) { m_strUserName = name; 
 void OBLoginData::SetProfileURL(const std::wstring& link) { m_strProfileURL = link; }
 
 std::wstring OBLoginData::DefaultLink(const wchar_t* path) const {
-  return L"http://" + m_hosts.defaultHost + path;
+  return L"http://" + hosts_.defaultHost + path;
 }
+
+}  // namespace service

@@ -14,12 +14,14 @@
 #include "platform/windows_names.h"
 #include "service/ServiceHosts.h"
 
-namespace http {
+namespace platform::http {
 class Probe;
 }
-namespace xml {
+namespace platform::xml {
 class Document;
 }
+
+namespace service {
 
 class OBLoginData {
  public:
@@ -83,10 +85,10 @@ class OBLoginData {
   // Makes the server host known: detection once, else the staging host.
   void EnsureServerUrl();
   void DetectServerInfo();
-  void StoreServiceInfo(const xml::Document& reply);
-  void ProbeThreadProc(http::Probe& probe);
+  void StoreServiceInfo(const platform::xml::Document& reply);
+  void ProbeThreadProc(platform::http::Probe& probe);
   // Stores what a sign-in reply carries but the token; returns 1 with the token.
-  unsigned int ReadSignInReply(const xml::Document& reply, std::wstring& token,
+  unsigned int ReadSignInReply(const platform::xml::Document& reply, std::wstring& token,
                                bool& firstLogin);
   void GetVideoID(std::wstring& videoID);
   std::wstring ServiceLink(std::wstring OBLoginData::*storedLink);
@@ -106,8 +108,10 @@ class OBLoginData {
   std::wstring m_strUuid;
   Categories m_mapCategory;
   mutable std::mutex m_csToken;
-  const ServiceHosts m_hosts;
+  const ServiceHosts hosts_;
   // Passed by the operations that open a BlockingScope, during which another
   // Python thread may delete the session.
-  OperationGate m_runningOperations;
+  platform::OperationGate runningOperations_;
 };
+
+}  // namespace service

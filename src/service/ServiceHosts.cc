@@ -4,11 +4,13 @@
 
 #include "platform/text.h"
 
+namespace service {
+
 namespace {
 
 std::wstring Setting(const char* variable, const wchar_t* fallback) {
   const char* value = std::getenv(variable);
-  return value && *value ? text::Utf8ToWide(value) : fallback;
+  return value && *value ? platform::Utf8ToWide(value) : fallback;
 }
 
 }  // namespace
@@ -17,3 +19,5 @@ ServiceHosts ServiceHosts::FromEnvironment() {
   return ServiceHosts{Setting(kDefaultHostVariable, kDefaultHost), Setting(kStagingHostVariable, kStagingHost),
                       Setting(kDetectionHostVariable, kDetectionHost)};
 }
+
+}  // namespace service

@@ -2,6 +2,8 @@
 
 #include <string>
 
+namespace service {
+
 // The three host names of the community service, read when a session is made:
 // compiled defaults, each overridden by its environment variable when that is set
 // and not empty.
@@ -19,3 +21,5 @@ struct ServiceHosts {
   std::wstring stagingHost;    // server host when discovery finds none
   std::wstring detectionHost;  // host of the detection request and its probe
 };
+
+}  // namespace service

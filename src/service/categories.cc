@@ -10,6 +10,8 @@
 #include "service/reply_walk.h"
 #include "service/server_request.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kCategoryServlet[] = L"/servlet/getPresetCategory";
@@ -22,14 +24,14 @@ constexpr int kMostCategoriesPerReply = 10000;
 
 // Adds the reply's categories to the map, replacing the names of known ids;
 // past the bound the rest of the reply is ignored.
-void AddCategories(const xml::Document& reply, OBLoginData::Categories& categories) {
+void AddCategories(const platform::xml::Document& reply, OBLoginData::Categories& categories) {
   int taken = 0;
-  for (const xml::Node& list : ChildrenNamed(reply.Top(), kCategoriesElement)) {
-    for (const xml::Node& category : ChildrenNamed(list, kCategoryElement)) {
+  for (const platform::xml::Node& list : ChildrenNamed(reply.Top(), kCategoriesElement)) {
+    for (const platform::xml::Node& category : ChildrenNamed(list, kCategoryElement)) {
       const std::wstring id = category.Attribute(kCategoryIdAttribute);
       if (id.empty()) continue;
       if (taken == kMostCategoriesPerReply) {
-        TraceMessage(L"GetPresetCategory: only the first %d categories of the reply are kept.",
+        diag::TraceMessage(L"GetPresetCategory: only the first %d categories of the reply are kept.",
                      kMostCategoriesPerReply);
         return;
       }
@@ -44,10 +46,10 @@ void AddCategories(const xml::Document& reply, OBLoginData::Categories& categori
 const OBLoginData::Categories& OBLoginData::GetPresetCategory(const wchar_t* language) {
   EnsureServerUrl();
   const std::wstring path =
-      QueryPath(kCategoryServlet, {{L"Locid", text::WideView(language)}, {L"Version", m_strVersion}});
+      QueryPath(kCategoryServlet, {{L"Locid", platform::WideView(language)}, {L"Version", m_strVersion}});
   // A failed exchange adds nothing: the categories of earlier calls are returned.
-  if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
-    AddCategories(xml::Document(std::move(*reply)), m_mapCategory);
+  if (auto reply = PostToServer(m_strServerUrl, path, ReplyCoding::kUtf8)) {
+    AddCategories(platform::xml::Document(std::move(*reply)), m_mapCategory);
   }
   return m_mapCategory;
 }
@@ -58,3 +60,5 @@ int OBLoginData::GetCategroyName(int id, std::wstring& name) const {
   name = found->second;
   return 1;
 }
+
+}  // namespace service

@@ -5,11 +5,14 @@
 #include <string_view>
 
 #include "diag/trace.h"
+#include "platform/ascii.h"
 #include "platform/blocking_scope.h"
 #include "platform/text.h"
 #include "platform/xml.h"
 #include "service/OBLoginData.h"
 #include "service/exchange.h"
+
+namespace service {
 
 namespace {
 
@@ -27,8 +30,7 @@ struct InfoField {
 };
 
 bool IsHostNameCharacter(wchar_t c) {
-  return (c >= L'a' && c <= L'z') || (c >= L'A' && c <= L'Z') || (c >= L'0' && c <= L'9') ||
-         c == L'-' || c == L'.';
+  return platform::IsLetterOrDigit(c) || c == L'-' || c == L'.';
 }
 
 // The server host is spliced into every later URL: a port, a path, a user or a
@@ -41,44 +43,43 @@ bool IsBareHostName(std::wstring_view value) {
 
 void OBLoginData::InitOBServerURL() {
   // Ends last: after every use of the session, with the lock taken back.
-  const OperationGate::Pass running(m_runningOperations);
+  const platform::OperationGate::Pass running(runningOperations_);
   if (!running) return;
-  const BlockingScope blocking;
+  const platform::BlockingScope blocking;
   EnsureServerUrl();
 }
 
 void OBLoginData::SetOBURLAsReg(const wchar_t* serverHost) {
-  m_strServerUrl = text::WideView(serverHost);
+  m_strServerUrl = platform::WideView(serverHost);
 }
 
 void OBLoginData::EnsureServerUrl() {
   if (!m_strServerUrl.empty()) return;
   DetectServerInfo();
-  TraceMessage(L"Get OB server URL from server. URL = %s", m_strServerUrl.c_str());
+  diag::TraceMessage(L"Get OB server URL from server. URL = %s", m_strServerUrl.c_str());
   if (m_strServerUrl.empty()) {
-    m_strServerUrl = m_hosts.stagingHost;
-    TraceMessage(L"Use static URL as OB server URL.");
+    m_strServerUrl = hosts_.stagingHost;
+    diag::TraceMessage(L"Use static URL as OB server URL.");
   }
 }
 
 void OBLoginData::DetectServerInfo() {
-  const std::string probeUrl = "http://" + text::WideToUtf8(m_hosts.detectionHost);
+  const std::string probeUrl = "http://" + platform::WideToUtf8(hosts_.detectionHost);
   if (!CheckServerReachable(probeUrl.c_str())) return;
 
   service::ServiceRequest request;
-  request.host = m_hosts.detectionHost;
+  request.host = hosts_.detectionHost;
   request.verb = kDetectionVerb;
   request.path = std::wstring(kDetectionPage) + L"?ap=lumivanta&version=" +
                  service::EscapePathValue(m_strVersion);
   if (!m_strVersionType.empty()) {
     request.path += L"&versionType=" + service::EscapePathValue(m_strVersionType);
   }
-  request.read = service::ReplyRead::kByLength;
   std::optional<std::string> reply = service::RunExchange(request);
-  if (reply) StoreServiceInfo(xml::Document(service::DecodeAnsiReply(std::move(*reply))));
+  if (reply) StoreServiceInfo(platform::xml::Document(service::DecodeAnsiReply(std::move(*reply))));
 }
 
-void OBLoginData::StoreServiceInfo(const xml::Document& reply) {
+void OBLoginData::StoreServiceInfo(const platform::xml::Document& reply) {
   const InfoField fields[] = {
       {"INFO/APIUrl", &OBLoginData::m_strServerUrl, nullptr, nullptr, IsBareHostName,
        L"Update OBInfo fail: APIUrl is not a host name: %s"},
@@ -93,14 +94,16 @@ void OBLoginData::StoreServiceInfo(const xml::Document& reply) {
        L"Update OBInfo fail: Can not parse VideoGallery from xml."},
   };
   for (const InfoField& field : fields) {
-    const xml::Lookup node = reply.NodeText(field.path);
-    if (node.failed() && field.failedLine) TraceMessage(field.failedLine);
+    const platform::xml::Lookup node = reply.NodeText(field.path);
+    if (node.failed() && field.failedLine) diag::TraceMessage(field.failedLine);
     if (!node.found()) continue;
     if (field.acceptable && !field.acceptable(node.text)) {
-      TraceMessage(field.refusedLine, node.text.c_str());
+      diag::TraceMessage(field.refusedLine, node.text.c_str());
       continue;
     }
     this->*field.member = node.text;
-    if (field.storedLine) TraceMessage(field.storedLine, (this->*field.member).c_str());
+    if (field.storedLine) diag::TraceMessage(field.storedLine, (this->*field.member).c_str());
   }
 }
+
+}  // namespace service

@@ -9,6 +9,8 @@
 #include "service/server_request.h"
 #include "service/unescape_url.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kEffectServlet[] = L"/servlet/GetEffectByGUIDForQZM";
@@ -16,10 +18,10 @@ constexpr wchar_t kPipElement[] = L"PIP";
 constexpr wchar_t kPipUrlElement[] = L"pipURL";
 
 // The last "pipURL" under the last "PIP" that holds one; empty when there is none.
-std::wstring EffectAddress(const xml::Document& reply) {
+std::wstring EffectAddress(const platform::xml::Document& reply) {
   std::wstring address;
-  for (const xml::Node& pip : ChildrenNamed(reply.Top(), kPipElement)) {
-    for (const xml::Node& link : ChildrenNamed(pip, kPipUrlElement)) address = link.Text();
+  for (const platform::xml::Node& pip : ChildrenNamed(reply.Top(), kPipElement)) {
+    for (const platform::xml::Node& link : ChildrenNamed(pip, kPipUrlElement)) address = link.Text();
   }
   return address;
 }
@@ -33,8 +35,10 @@ std::optional<std::wstring> OBLoginData::GetEffectByGUID(const wchar_t* guid) {
   EnsureServerUrl();
   const std::wstring path = QueryPath(kEffectServlet, {{L"token", token}, {L"guid", guid}});
   std::wstring address;
-  if (auto reply = PostToServer(m_strServerUrl, path, service::ReplyRead::kAvailable, ReplyCoding::kUtf8)) {
-    address = EffectAddress(xml::Document(std::move(*reply)));
+  if (auto reply = PostToServer(m_strServerUrl, path, ReplyCoding::kUtf8)) {
+    address = EffectAddress(platform::xml::Document(std::move(*reply)));
   }
   return UnescapeUrl(address);
 }
+
+}  // namespace service

@@ -3,6 +3,8 @@
 #include "platform/text.h"
 #include "service/percent_encoding.h"
 
+namespace service {
+
 namespace {
 
 constexpr unsigned char kFirstPrintable = 0x20;
@@ -18,5 +20,7 @@ bool IsUnsafe(unsigned char byte) {
 }  // namespace
 
 std::wstring EscapeFormValue(std::wstring_view text) {
-  return PercentEncode(text::WideToUtf8(text), IsUnsafe, kLowerHexDigits);
+  return PercentEncode(platform::WideToUtf8(text), IsUnsafe, platform::kLowerHexDigits);
 }
+
+}  // namespace service

@@ -1,8 +1,8 @@
 #include "service/exchange.h"
 
-#include <algorithm>
 #include <utility>
 
+#include "platform/ascii.h"
 #include "platform/http.h"
 #include "platform/text.h"
 #include "service/percent_encoding.h"
@@ -14,23 +14,18 @@ constexpr unsigned char kFirstPrintable = 0x21;  // space and controls lie below
 constexpr unsigned char kDelete = 0x7F;          // it and every non-ASCII byte lie above
 constexpr char kFragmentMark = '#';
 
-http::Scheme SchemeOf(Transport transport) {
-  return transport == Transport::kTls ? http::Scheme::kHttps : http::Scheme::kHttp;
+platform::http::Scheme SchemeOf(Transport transport) {
+  return transport == Transport::kTls ? platform::http::Scheme::kHttps : platform::http::Scheme::kHttp;
 }
 
 std::uint16_t PortOf(Transport transport) {
-  return transport == Transport::kTls ? http::kHttpsPort : http::kHttpPort;
+  return transport == Transport::kTls ? platform::http::kHttpsPort : platform::http::kHttpPort;
 }
 
-bool SendRequest(http::Request& request, const ServiceRequest& what) {
-  if (!what.headers.empty() && win::Failed(request.AddHeaders(what.headers))) return false;
-  return !win::Failed(request.Send(what.body));
+bool SendRequest(platform::http::Request& request, const ServiceRequest& what) {
+  if (!what.headers.empty() && platform::Failed(request.AddHeaders(what.headers))) return false;
+  return !platform::Failed(request.Send(what.body));
 }
-
-// The service's three readings differ only in how much of a body that WinInet
-// had not yet received they would see. libcurl hands over the body framed by its
-// announced length, its chunks or the connection's end, so each takes it whole.
-std::string ReadReply(http::Request& request, ReplyRead) { return request.TakeBody(); }
 
 bool MayNotStandInTarget(unsigned char byte) {
   return byte < kFirstPrintable || byte >= kDelete || byte == kFragmentMark;
@@ -39,23 +34,26 @@ bool MayNotStandInTarget(unsigned char byte) {
 }  // namespace
 
 std::optional<std::string> RunExchange(const ServiceRequest& what) {
-  const http::Session session(what.agent);
-  const http::Connection connection(session, text::WideToUtf8(what.host),
+  const platform::http::Session session(what.agent);
+  const platform::http::Connection connection(session, platform::WideToUtf8(what.host),
                                     PortOf(what.transport), SchemeOf(what.transport));
-  http::Request request(connection, what.verb, text::WideToUtf8(what.path));
+  platform::http::Request request(connection, what.verb, platform::WideToUtf8(what.path));
   if (!SendRequest(request, what)) return std::nullopt;
-  return ReadReply(request, what.read);
+  return request.TakeBody();
 }
 
 std::string DecodeUtf8Reply(std::string bytes) {
-  bytes.resize(std::min(bytes.size(), bytes.find('\0')));
-  return text::ValidUtf8(std::move(bytes));
+  bytes.resize(platform::UpToNul(bytes).size());
+  return platform::ValidUtf8(std::move(bytes));
 }
 
-std::string DecodeAnsiReply(std::string bytes) { return DecodeUtf8Reply(std::move(bytes)); }
+std::string DecodeAnsiReply(std::string bytes) {
+  bytes.resize(platform::UpToNul(bytes).size());
+  return platform::AnsiToUtf8(std::move(bytes));
+}
 
 std::wstring EscapePathValue(std::wstring_view value) {
-  return PercentEncode(text::WideToUtf8(value), MayNotStandInTarget, kUpperHexDigits);
+  return PercentEncode(platform::WideToUtf8(value), MayNotStandInTarget, platform::kUpperHexDigits);
 }
 
 }  // namespace service

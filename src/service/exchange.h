@@ -11,11 +11,6 @@
 
 namespace service {
 
-// How an operation takes the reply body. This transport frames every body (an
-// announced length, chunks or the end of the connection), so each reading gets
-// the whole body; a body longer than its announced length is cut there.
-enum class ReplyRead { kByLength, kAvailable, kToEnd };
-
 enum class Transport {
   kHttp,  // port 80
   kTls,   // port 443; the certificate's issuer, name and dates are all verified
@@ -29,19 +24,19 @@ struct ServiceRequest {
   std::string agent;    // empty: no User-Agent of the session's own
   std::string headers;  // header lines separated by LF
   std::string body;
-  ReplyRead read = ReplyRead::kByLength;
 };
 
-// The reply body, whatever the HTTP status; nothing when an internet error
+// The whole reply body, which the transport frames by its announced length
+// (cut there), its chunks or the connection's end, whatever the HTTP status; nothing when an internet error
 // ended the exchange or the reply could not be read (one announcing more than
-// http::kMaxReplyBytes included).
+// platform::http::kMaxReplyBytes included).
 std::optional<std::string> RunExchange(const ServiceRequest& request);
 
 // The reply bytes up to the first zero byte, as UTF-8 text for the XML reader
 // (undecodable bytes become U+FFFD). The text stays narrow: a wide copy of a
 // large reply would take four times its size.
 std::string DecodeUtf8Reply(std::string bytes);
-// The same for replies in the thread's ANSI code page, which is UTF-8 here.
+// The same for replies in the thread's ANSI code page.
 std::string DecodeAnsiReply(std::string bytes);
 
 // A query value made fit to stand in a request target: its UTF-8 bytes that may

@@ -6,6 +6,8 @@
 #include "service/OBLoginData.h"
 #include "service/unescape_url.h"
 
+namespace service {
+
 std::wstring OBLoginData::GetPresetDownloadURL() { return ServiceLink(&OBLoginData::m_strAdjustmentPresetURL); }
 
 std::wstring OBLoginData::GetSignUpURL() { return ServiceLink(&OBLoginData::m_strSignUpURL); }
@@ -22,3 +24,5 @@ std::wstring OBLoginData::ServiceLink(std::wstring OBLoginData::*storedLink) {
   EnsureServerUrl();
   return UnescapeUrl(L"http://" + m_strServerUrl + this->*storedLink + L"&uuid=" + m_strUuid);
 }
+
+}  // namespace service

@@ -12,6 +12,8 @@
 #include "service/escape_form_value.h"
 #include "service/exchange.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kSignInPath[] = L"/servlet/memLogin";
@@ -26,7 +28,7 @@ std::string SignInBody(const std::wstring& account, const std::wstring& password
                        const std::wstring& uuid) {
   const std::wstring body = L"account=" + account + L"&pwd=" + password + L"&AP=KRV&Version=" +
                             version + L"&versionType=" + versionType + L"&uuid=" + uuid;
-  return text::WideToUtf8(body);
+  return platform::WideToUtf8(body);
 }
 
 // Member fields of the reply after the token, in the order they are read.
@@ -40,18 +42,18 @@ struct ReplyField {
 
 unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* password) {
   if (IsEmpty(account) || IsEmpty(password)) {
-    TraceMessage(L"Login OB fail: Empty user name or password");
+    diag::TraceMessage(L"Login OB fail: Empty user name or password");
     m_bLoggedIn = 0;
     return 0;
   }
   // Ends last: after every use of the session, with the lock taken back.
-  const OperationGate::Pass running(m_runningOperations);
+  const platform::OperationGate::Pass running(runningOperations_);
   if (!running) return 0;
-  const BlockingScope blocking;
+  const platform::BlockingScope blocking;
   EnsureServerUrl();
-  const std::string probeUrl = "http://" + text::WideToUtf8(m_hosts.defaultHost);
+  const std::string probeUrl = "http://" + platform::WideToUtf8(hosts_.defaultHost);
   if (!CheckServerReachable(probeUrl.c_str())) {
-    TraceMessage(L"Login OB fail: Can not reach the OB server");
+    diag::TraceMessage(L"Login OB fail: Can not reach the OB server");
     return 0;
   }
 
@@ -62,14 +64,13 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
   request.headers = kSignInHeaders;
   request.body = SignInBody(EscapeFormValue(account), EscapeFormValue(password), m_strVersion,
                             m_strVersionType, m_strUuid);
-  request.read = service::ReplyRead::kByLength;
   std::optional<std::string> reply = service::RunExchange(request);
   if (!reply) return 0;
 
   std::wstring token;
   bool firstLogin = false;
   const unsigned int result =
-      ReadSignInReply(xml::Document(service::DecodeUtf8Reply(std::move(*reply))), token, firstLogin);
+      ReadSignInReply(platform::xml::Document(service::DecodeUtf8Reply(std::move(*reply))), token, firstLogin);
   if (firstLogin) return 0;
   if (result == 1) {
     m_bLoggedIn = 1;
@@ -78,22 +79,22 @@ unsigned int OBLoginData::LoginOrbishare(const wchar_t* account, const wchar_t* 
   return result;
 }
 
-unsigned int OBLoginData::ReadSignInReply(const xml::Document& reply, std::wstring& token,
+unsigned int OBLoginData::ReadSignInReply(const platform::xml::Document& reply, std::wstring& token,
                                           bool& firstLogin) {
-  const xml::Lookup firstLoginUrl = reply.NodeText("info/firstloginUrl");
+  const platform::xml::Lookup firstLoginUrl = reply.NodeText("info/firstloginUrl");
   if (firstLoginUrl.found() && !firstLoginUrl.text.empty()) {
-    shell::OpenLink(firstLoginUrl.text);  // only an http or https link is opened
+    platform::OpenLink(firstLoginUrl.text);  // only an http or https link is opened
     firstLogin = true;
   }
 
   unsigned int result = 0;
-  const xml::Lookup tokenNode = reply.NodeText("info/tokenid");
-  if (tokenNode.failed()) TraceMessage(L"Login OB fail: Can not parse tokenid from xml.");
+  const platform::xml::Lookup tokenNode = reply.NodeText("info/tokenid");
+  if (tokenNode.failed()) diag::TraceMessage(L"Login OB fail: Can not parse tokenid from xml.");
   if (tokenNode.found()) {
     token = tokenNode.text;
     result = 1;
   } else {
-    TraceMessage(L"No tokenID, login failed!!");
+    diag::TraceMessage(L"No tokenID, login failed!!");
   }
 
   const ReplyField fields[] = {
@@ -108,9 +109,9 @@ unsigned int OBLoginData::ReadSignInReply(const xml::Document& reply, std::wstri
       {"info/errMsg", nullptr, L"Login OB fail: Can not parse errMsg from xml."},
   };
   for (const ReplyField& field : fields) {
-    const xml::Lookup node = reply.NodeText(field.path);
+    const platform::xml::Lookup node = reply.NodeText(field.path);
     if (node.failed()) {
-      TraceMessage(field.failedLine);
+      diag::TraceMessage(field.failedLine);
       result = 0;
     }
     if (node.found() && field.store) field.store(*this, node.text);
@@ -131,3 +132,5 @@ void OBLoginData::LogoutOrbishare() {
   m_strLensCorrectionURL.clear();
   m_strVideoGalleryURL.clear();
 }
+
+}  // namespace service

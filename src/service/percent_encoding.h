@@ -5,8 +5,9 @@
 #include <string>
 #include <string_view>
 
-inline constexpr char kUpperHexDigits[] = "0123456789ABCDEF";
-inline constexpr char kLowerHexDigits[] = "0123456789abcdef";
+#include "platform/ascii.h"
+
+namespace service {
 
 // The bytes as wide text, each byte for which `mustEscape` holds written as "%"
 // and two hex digits taken from `digits`.
@@ -26,3 +27,5 @@ std::wstring PercentEncode(std::string_view bytes, Predicate mustEscape, const c
   }
   return encoded;
 }
+
+}  // namespace service

@@ -10,6 +10,8 @@
 #include "platform/http_probe.h"
 #include "service/OBLoginData.h"
 
+namespace service {
+
 namespace {
 
 constexpr char kProbeAgent[] = "Microsoft Internet Explorer";
@@ -22,11 +24,11 @@ constexpr int kMostWaits = 11;  // 5.5 s in all
 // once, whichever thread comes first); the members are only cleared.
 void ClearHandle(HINTERNET& member) { __atomic_store_n(&member, nullptr, __ATOMIC_RELEASE); }
 
-void PutHandle(HINTERNET& member, http::ProbeHandle& handle) {
+void PutHandle(HINTERNET& member, platform::http::ProbeHandle& handle) {
   __atomic_store_n(&member, static_cast<HINTERNET>(&handle), __ATOMIC_RELEASE);
 }
 
-void CloseHandle(HINTERNET& member, http::ProbeHandle& handle) {
+void CloseHandle(HINTERNET& member, platform::http::ProbeHandle& handle) {
   ClearHandle(member);
   handle.Close();
 }
@@ -49,7 +51,7 @@ BOOL OBLoginData::CheckServerReachable(const char* url) {
   std::memcpy(m_szChkServerUrl, url, length + 1);
 
   // Declared first, so that it outlives the thread that uses it.
-  http::Probe probe(kProbeAgent);
+  platform::http::Probe probe(kProbeAgent);
   std::future<void> finished;
   try {
     finished = std::async(std::launch::async, [this, &probe] { ProbeThreadProc(probe); });
@@ -64,7 +66,7 @@ BOOL OBLoginData::CheckServerReachable(const char* url) {
   return m_bServerReachable;
 }
 
-void OBLoginData::ProbeThreadProc(http::Probe& probe) {
+void OBLoginData::ProbeThreadProc(platform::http::Probe& probe) {
   m_bServerReachable = 0;
   ClearHandle(m_hInternet);
   ClearHandle(m_hConnect);
@@ -77,3 +79,5 @@ void OBLoginData::ProbeThreadProc(http::Probe& probe) {
   }
   CloseHandle(m_hInternet, probe.session());
 }
+
+}  // namespace service

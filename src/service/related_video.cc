@@ -10,6 +10,8 @@
 #include "service/OBLoginData.h"
 #include "service/server_request.h"
 
+namespace service {
+
 namespace {
 
 constexpr wchar_t kRelateVideoServlet[] = L"/servlet/setRelateVideo";
@@ -21,7 +23,7 @@ constexpr char kVideoUrlPath[] = "info/videoUrl";
 // is not XML or one without the node.
 std::optional<std::wstring> ReplyField(std::optional<std::string> reply, const char* path) {
   if (!reply || reply->empty()) return std::nullopt;
-  xml::Lookup field = xml::Document(std::move(*reply)).NodeText(path);
+  platform::xml::Lookup field = platform::xml::Document(std::move(*reply)).NodeText(path);
   if (!field.found()) return std::nullopt;
   return std::move(field.text);
 }
@@ -31,18 +33,18 @@ std::optional<std::wstring> ReplyField(std::optional<std::string> reply, const c
 std::optional<std::wstring> OBLoginData::SetRelateVideo(const wchar_t* videoURL, const wchar_t* website,
                                                         const wchar_t* videoInfo) {
   if (!videoURL || !website || !videoInfo) {
-    TraceMessage(L"SetRelateVideo wszVideoURL|wszWebsite|wszVideoInfo fail");
+    diag::TraceMessage(L"SetRelateVideo wszVideoURL|wszWebsite|wszVideoInfo fail");
     return std::nullopt;
   }
   const std::wstring token = GetToken();
   if (token.empty()) {
-    TraceMessage(L"SetRelateVideo GetTokenID fail");
+    diag::TraceMessage(L"SetRelateVideo GetTokenID fail");
     return std::nullopt;
   }
   std::wstring videoID;
   GetVideoID(videoID);
   if (videoID.empty()) {
-    TraceMessage(L"SetRelateVideo GetVideoID fail");
+    diag::TraceMessage(L"SetRelateVideo GetVideoID fail");
     return std::nullopt;
   }
   EnsureServerUrl();
@@ -56,7 +58,7 @@ std::optional<std::wstring> OBLoginData::SetRelateVideo(const wchar_t* videoURL,
                                                             {L"versionType", m_strVersionType},
                                                             {L"uuid", m_strUuid}}) +
                             L'&' + service::EscapePathValue(videoInfo);
-  return ReplyField(PostToServer(m_strServerUrl, path, service::ReplyRead::kToEnd, ReplyCoding::kAnsi),
+  return ReplyField(PostToServer(m_strServerUrl, path, ReplyCoding::kAnsi),
                     kVideoUrlPath);
 }
 
@@ -70,8 +72,10 @@ void OBLoginData::GetVideoID(std::wstring& videoID) {
                                                             {L"uuid", m_strUuid}});
   // Sent as a fresh request where the registration may reuse a connection; this
   // transport keeps no connection or cache between requests, so both go out alike.
-  if (auto id = ReplyField(PostToServer(m_strServerUrl, path, service::ReplyRead::kToEnd, ReplyCoding::kAnsi),
+  if (auto id = ReplyField(PostToServer(m_strServerUrl, path, ReplyCoding::kAnsi),
                            kVideoIdPath)) {
     videoID = std::move(*id);
   }
 }
+
+}  // namespace service

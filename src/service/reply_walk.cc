@@ -1,23 +1,15 @@
 #include "service/reply_walk.h"
 
-#include <algorithm>
-#include <string>
+#include "platform/ascii.h"
 
-namespace {
+namespace service {
 
-wchar_t AsciiLower(wchar_t c) { return c >= L'A' && c <= L'Z' ? c - L'A' + L'a' : c; }
-
-bool EqualIgnoringCase(std::wstring_view a, std::wstring_view b) {
-  return a.size() == b.size() &&
-         std::equal(a.begin(), a.end(), b.begin(), [](wchar_t x, wchar_t y) { return AsciiLower(x) == AsciiLower(y); });
-}
-
-}  // namespace
-
-std::vector<xml::Node> ChildrenNamed(const xml::Node& parent, std::wstring_view name) {
-  std::vector<xml::Node> matches;
-  for (const xml::Node& child : parent.Children()) {
-    if (child.type() != xml::NodeType::kComment && EqualIgnoringCase(child.Name(), name)) matches.push_back(child);
+std::vector<platform::xml::Node> ChildrenNamed(const platform::xml::Node& parent, std::wstring_view name) {
+  std::vector<platform::xml::Node> matches;
+  for (const platform::xml::Node& child : parent.Children()) {
+    if (child.type() != platform::xml::NodeType::kComment && platform::EqualIgnoringCase(child.Name(), name)) matches.push_back(child);
   }
   return matches;
 }
+
+}  // namespace service

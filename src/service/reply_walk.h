@@ -7,6 +7,10 @@
 
 #include "platform/xml.h"
 
+namespace service {
+
 // The children of `parent` (the document's top or an element) whose name equals
 // `name` ignoring ASCII letter case, in document order; comments are never matched.
-std::vector<xml::Node> ChildrenNamed(const xml::Node& parent, std::wstring_view name);
+std::vector<platform::xml::Node> ChildrenNamed(const platform::xml::Node& parent, std::wstring_view name);
+
+}  // namespace service

@@ -1,5 +1,7 @@
 #include "service/server_request.h"
 
+namespace service {
+
 std::wstring QueryPath(std::wstring_view servlet, std::initializer_list<QueryField> fields) {
   std::wstring path(servlet);
   wchar_t separator = L'?';
@@ -14,13 +16,14 @@ std::wstring QueryPath(std::wstring_view servlet, std::initializer_list<QueryFie
 }
 
 std::optional<std::string> PostToServer(const std::wstring& host, const std::wstring& path,
-                                        service::ReplyRead read, ReplyCoding coding) {
+                                        ReplyCoding coding) {
   service::ServiceRequest request;
   request.host = host;
   request.path = path;
-  request.read = read;
   std::optional<std::string> reply = service::RunExchange(request);
   if (!reply) return std::nullopt;
   return coding == ReplyCoding::kUtf8 ? service::DecodeUtf8Reply(std::move(*reply))
                                       : service::DecodeAnsiReply(std::move(*reply));
 }
+
+}  // namespace service

@@ -11,6 +11,8 @@
 
 #include "service/exchange.h"
 
+namespace service {
+
 // How the reply's bytes become text.
 enum class ReplyCoding { kUtf8, kAnsi };
 
@@ -22,4 +24,6 @@ std::wstring QueryPath(std::wstring_view servlet, std::initializer_list<QueryFie
 
 // The reply text (UTF-8), whatever the HTTP status; nothing when the exchange failed.
 std::optional<std::string> PostToServer(const std::wstring& host, const std::wstring& path,
-                                         service::ReplyRead read, ReplyCoding coding);
+                                         ReplyCoding coding);
+
+}  // namespace service

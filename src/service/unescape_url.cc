@@ -2,6 +2,10 @@
 
 #include <cwchar>
 
+#include "platform/ascii.h"
+
+namespace service {
+
 namespace {
 
 constexpr wchar_t kEscape = L'%';
@@ -16,14 +20,10 @@ wchar_t DecodeEscape(std::wstring_view digits) {
   return static_cast<wchar_t>(std::wcstoul(terminated, nullptr, kHexBase) & kUtf16UnitMask);
 }
 
-std::wstring_view UpToFirstZero(std::wstring_view text) {
-  return text.substr(0, text.find(L'\0'));
-}
-
 }  // namespace
 
 std::wstring UnescapeUrl(std::wstring_view text) {
-  text = UpToFirstZero(text);
+  text = platform::UpToNul(text);
   std::wstring result;
   result.reserve(text.size());
   std::size_t at = 0;
@@ -40,3 +40,5 @@ std::wstring UnescapeUrl(std::wstring_view text) {
   }
   return result;
 }
+
+}  // namespace service

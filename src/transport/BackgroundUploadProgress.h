@@ -5,6 +5,8 @@
 
 #include "transport/UploadProgress.h"
 
+namespace transport {
+
 class BackgroundUploadProgress : public UploadProgress {
  public:
   // Never raised; listeners ignore it or pass it on.
@@ -15,3 +17,5 @@ class BackgroundUploadProgress : public UploadProgress {
  protected:
   ~BackgroundUploadProgress() = default;
 };
+
+}  // namespace transport

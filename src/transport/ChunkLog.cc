@@ -2,6 +2,8 @@
 
 #include <cstdlib>
 
+namespace transport {
+
 ChunkLog::ChunkLog() {
   const char* path = std::getenv(kPathVariable);
   if (path == nullptr || *path == '\0') return;
@@ -14,3 +16,5 @@ void ChunkLog::Append(std::size_t bytes, Stamp begin) {
       std::chrono::steady_clock::now() - begin);
   *file_ << bytes << ' ' << micros.count() << '\n' << std::flush;
 }
+
+}  // namespace transport

@@ -8,6 +8,8 @@
 #include <fstream>
 #include <optional>
 
+namespace transport {
+
 class ChunkLog {
  public:
   static constexpr char kPathVariable[] = "PYUPLOADER_CHUNK_LOG";
@@ -29,3 +31,5 @@ class ChunkLog {
 
   std::optional<std::ofstream> file_;
 };
+
+}  // namespace transport

@@ -6,6 +6,8 @@
 #include <cstdint>
 #include <optional>
 
+namespace transport {
+
 struct ChunkPause {
   static constexpr char kVariable[] = "PYUPLOADER_CHUNK_PAUSE_MS";
   static constexpr std::uint32_t kDefaultMs = 50;
@@ -14,3 +16,5 @@ struct ChunkPause {
   // The milliseconds that `text` gives, or nothing when it is refused.
   static std::optional<std::uint32_t> Parse(const char* text);
 };
+
+}  // namespace transport

@@ -5,11 +5,13 @@
 #include "transport/UploadRequest.h"
 #include "transport/UploadStatus.h"
 
+namespace transport {
+
 namespace {
 
 // A call abandoned at the listener's request ends the upload as cancelled.
-win::Status CancelledOr(win::Status status) {
-  const bool cancelled = status == win::StatusFromWin32(win::kErrorInternetOperationCancelled);
+platform::Status CancelledOr(platform::Status status) {
+  const bool cancelled = status == platform::StatusFromWin32(platform::kErrorInternetOperationCancelled);
   return cancelled ? UPLOAD_E_CANCELLED : status;
 }
 
@@ -19,7 +21,7 @@ UploadConnectionOpener HttpUploadConnection::Opener(std::uint16_t port) {
   return [port](const UploadRequest& request, UploadProgress* listener,
                 std::unique_ptr<UploadConnection>* out) {
     *out = std::make_unique<HttpUploadConnection>(request.host, port, request.path, listener);
-    return win::kOk;
+    return platform::kOk;
   };
 }
 
@@ -27,26 +29,26 @@ HttpUploadConnection::HttpUploadConnection(const std::string& host, std::uint16_
                                            const std::string& path, UploadProgress* listener)
     : listener_(listener),
       session_(kAgent, this),
-      connection_(session_, host, port, http::Scheme::kHttp),
+      connection_(session_, host, port, platform::http::Scheme::kHttp),
       request_(connection_, "POST", path) {}
 
-win::Status HttpUploadConnection::AddHeader(const std::string& line) {
+platform::Status HttpUploadConnection::AddHeader(const std::string& line) {
   return request_.AddHeaders(line);
 }
 
-win::Status HttpUploadConnection::Start(std::uint32_t contentLength) {
+platform::Status HttpUploadConnection::Start(std::uint32_t contentLength) {
   return CancelledOr(request_.Start(contentLength));
 }
 
-win::Status HttpUploadConnection::Write(std::string_view piece) {
+platform::Status HttpUploadConnection::Write(std::string_view piece) {
   return CancelledOr(request_.Write(piece));
 }
 
 // A reply whose head arrived has ended the request, even when its body could
 // not be read whole.
-win::Status HttpUploadConnection::End() {
-  const win::Status ended = CancelledOr(request_.End());
-  return request_.status_code() != 0 ? win::kOk : ended;
+platform::Status HttpUploadConnection::End() {
+  const platform::Status ended = CancelledOr(request_.End());
+  return request_.status_code() != 0 ? platform::kOk : ended;
 }
 
 bool HttpUploadConnection::QueryStatusCode(std::uint32_t* code) {
@@ -54,22 +56,22 @@ bool HttpUploadConnection::QueryStatusCode(std::uint32_t* code) {
   return *code != 0;
 }
 
-std::string HttpUploadConnection::ReadReply() { return request_.body(); }
+std::string HttpUploadConnection::ReadReply() { return request_.TakeBody(); }
 
 void HttpUploadConnection::OnResolvingName(const std::string& host) {
-  listener_->OnResolvingName(text::Utf8ToWide(host).c_str());
+  listener_->OnResolvingName(platform::Utf8ToWide(host).c_str());
 }
 
 void HttpUploadConnection::OnNameResolved(const std::string& address) {
-  listener_->OnNameResolved(text::Utf8ToWide(address).c_str());
+  listener_->OnNameResolved(platform::Utf8ToWide(address).c_str());
 }
 
 void HttpUploadConnection::OnConnectingToServer(const std::string& address) {
-  listener_->OnConnectingToServer(text::Utf8ToWide(address).c_str());
+  listener_->OnConnectingToServer(platform::Utf8ToWide(address).c_str());
 }
 
 void HttpUploadConnection::OnConnectedToServer(const std::string& address) {
-  listener_->OnConnectedToServer(text::Utf8ToWide(address).c_str());
+  listener_->OnConnectedToServer(platform::Utf8ToWide(address).c_str());
 }
 
 void HttpUploadConnection::OnSendingRequest() { listener_->OnSendingRequest(); }
@@ -81,3 +83,5 @@ void HttpUploadConnection::OnResponseReceived(std::uint32_t bytes) {
 void HttpUploadConnection::OnClosingConnection() { listener_->OnClosingConnection(); }
 void HttpUploadConnection::OnConnectionClosed() { listener_->OnConnectionClosed(); }
 bool HttpUploadConnection::IsCancelled() { return listener_->IsCancelled(); }
+
+}  // namespace transport

@@ -9,7 +9,9 @@
 #include "transport/UploadConnection.h"
 #include "transport/UploadEnvironment.h"
 
-class HttpUploadConnection : public UploadConnection, private http::ConnectionEvents {
+namespace transport {
+
+class HttpUploadConnection : public UploadConnection, private platform::http::ConnectionEvents {
  public:
   static constexpr const char* kAgent = "WinInetPost/0.0.4";
 
@@ -19,10 +21,10 @@ class HttpUploadConnection : public UploadConnection, private http::ConnectionEv
   HttpUploadConnection(const std::string& host, std::uint16_t port, const std::string& path,
                        UploadProgress* listener);
 
-  win::Status AddHeader(const std::string& line) override;
-  win::Status Start(std::uint32_t contentLength) override;
-  win::Status Write(std::string_view piece) override;
-  win::Status End() override;
+  platform::Status AddHeader(const std::string& line) override;
+  platform::Status Start(std::uint32_t contentLength) override;
+  platform::Status Write(std::string_view piece) override;
+  platform::Status End() override;
   bool QueryStatusCode(std::uint32_t* code) override;
   std::string ReadReply() override;
 
@@ -41,7 +43,9 @@ class HttpUploadConnection : public UploadConnection, private http::ConnectionEv
 
   // Closed in reverse order: request, connection, session.
   UploadProgress* listener_;
-  http::Session session_;
-  http::Connection connection_;
-  http::Request request_;
+  platform::http::Session session_;
+  platform::http::Connection connection_;
+  platform::http::Request request_;
 };
+
+}  // namespace transport

@@ -8,19 +8,23 @@
 
 #include "platform/win_error.h"
 
+namespace transport {
+
 class UploadConnection {
  public:
   virtual ~UploadConnection() = default;
 
-  virtual win::Status AddHeader(const std::string& line) = 0;
+  virtual platform::Status AddHeader(const std::string& line) = 0;
   // Sends the request head announcing a body of `contentLength` bytes.
-  virtual win::Status Start(std::uint32_t contentLength) = 0;
+  virtual platform::Status Start(std::uint32_t contentLength) = 0;
   // Returns once the connection has taken the whole piece.
-  virtual win::Status Write(std::string_view piece) = 0;
+  virtual platform::Status Write(std::string_view piece) = 0;
   // Ends the body; fails only when no reply came.
-  virtual win::Status End() = 0;
+  virtual platform::Status End() = 0;
   // False when the reply carried no status.
   virtual bool QueryStatusCode(std::uint32_t* code) = 0;
-  // The reply body, as much of it as could be read.
+  // The reply body, as much of it as could be read; asked for once.
   virtual std::string ReadReply() = 0;
 };
+
+}  // namespace transport

@@ -4,7 +4,11 @@
 #include "platform/http.h"
 #include "transport/HttpUploadConnection.h"
 
+namespace transport {
+
 UploadEnvironment UploadEnvironment::Platform() {
-  return UploadEnvironment{&timing::TickCount, &timing::Sleep,
-                           HttpUploadConnection::Opener(http::kHttpPort)};
+  return UploadEnvironment{&platform::TickCount, &platform::Sleep,
+                           HttpUploadConnection::Opener(platform::http::kHttpPort)};
 }
+
+}  // namespace transport

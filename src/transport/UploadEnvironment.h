@@ -10,12 +10,14 @@
 #include "transport/ChunkPause.h"
 #include "transport/UploadConnection.h"
 
+namespace transport {
+
 class UploadProgress;
 class UploadRequest;
 
 // Opens the POST for the request's path on its host; connection notifications
 // go to the listener.
-using UploadConnectionOpener = std::function<win::Status(
+using UploadConnectionOpener = std::function<platform::Status(
     const UploadRequest& request, UploadProgress* listener, std::unique_ptr<UploadConnection>* out)>;
 
 struct UploadEnvironment {
@@ -27,3 +29,5 @@ struct UploadEnvironment {
   // The steady clock, a real sleep, HTTP on port 80 and the default pause.
   static UploadEnvironment Platform();
 };
+
+}  // namespace transport

@@ -4,6 +4,8 @@
 
 #include <cstdint>
 
+namespace transport {
+
 class UploadProgress {
  public:
   // Connection notifications; the texts are only passed on, never read.
@@ -31,3 +33,5 @@ class UploadProgress {
  protected:
   ~UploadProgress() = default;
 };
+
+}  // namespace transport

@@ -3,6 +3,8 @@
 #include "platform/text.h"
 #include "platform/url.h"
 
+namespace transport {
+
 namespace {
 
 constexpr const char* kScheme = "http";
@@ -13,8 +15,8 @@ std::string TextOrEmpty(const char* text) { return text ? std::string(text) : st
 }  // namespace
 
 bool UploadRequest::SetUrl(const char* url) {
-  url::Components parts;
-  if (!url || !url::Split(url, &parts)) return false;
+  platform::UrlComponents parts;
+  if (!url || !platform::SplitUrl(url, &parts)) return false;
   if (parts.scheme != kScheme || parts.port != kPort) return false;
   if (!parts.user.empty() || !parts.password.empty() || !parts.extra.empty()) return false;
   host = parts.host;
@@ -27,10 +29,12 @@ void UploadRequest::AddField(const char* name, const char* value) {
 }
 
 void UploadRequest::AddFile(const wchar_t* name, const wchar_t* path) {
-  files.push_back(UploadFile{std::wstring(text::WideView(name)), std::wstring(text::WideView(path)),
+  files.push_back(UploadFile{std::wstring(platform::WideView(name)), std::wstring(platform::WideView(path)),
                              kFileContentType});
 }
 
 void UploadRequest::ClearFields() { fields.clear(); }
 
 void UploadRequest::ClearFiles() { files.clear(); }
+
+}  // namespace transport

@@ -9,6 +9,8 @@
 
 #include "transport/UploadFile.h"
 
+namespace transport {
+
 class UploadRequest {
  public:
   // Bytes per half-second assumed before anything has been measured.
@@ -23,8 +25,6 @@ class UploadRequest {
   void AddFile(const wchar_t* name, const wchar_t* path);
   void ClearFields();
   void ClearFiles();
-  std::map<std::string, std::string> FieldsSnapshot() const { return fields; }
-  std::vector<UploadFile> FilesSnapshot() const { return files; }
 
   std::string host;
   std::string path;
@@ -33,3 +33,5 @@ class UploadRequest {
   std::map<std::string, std::string> fields;
   std::uint32_t rateEstimate = kInitialRateEstimate;
 };
+
+}  // namespace transport

@@ -5,7 +5,11 @@
 
 #include "platform/win_error.h"
 
+namespace transport {
+
 struct UploadResult {
-  win::Status hr = win::kOk;
+  platform::Status hr = platform::kOk;
   std::uint32_t httpStatus = 0xFFFFFFFFu;  // not yet known
 };
+
+}  // namespace transport

@@ -9,6 +9,8 @@
 #include "transport/UploadResult.h"
 #include "transport/UploadStatus.h"
 
+namespace transport {
+
 namespace {
 
 // Lengths on the wire are 32-bit: a body or file of 4 GiB or more cannot be sent.
@@ -24,11 +26,11 @@ bool FitsTheWire(std::uint64_t length, const std::vector<std::uint64_t>& fileSiz
 }
 
 // The file no longer holds the bytes the announced length counted.
-win::Status FileChanged() { return win::StatusFromWin32(win::kErrorFileInvalid); }
+platform::Status FileChanged() { return platform::StatusFromWin32(platform::kErrorFileInvalid); }
 
 // Reads the next piece: a chunk, or the `left` bytes if fewer; with nothing left, one byte
 // more shows whether the file has grown.
-win::Status ReadNext(file::File& source, char* buffer, std::uint32_t chunk, std::uint32_t left,
+platform::Status ReadNext(platform::File& source, char* buffer, std::uint32_t chunk, std::uint32_t left,
                      std::size_t* count) {
   const std::size_t wanted = left == 0 ? 1 : std::min(chunk, left);
   return source.Read(buffer, wanted, count);
@@ -69,90 +71,90 @@ Uploader::Uploader(UploadProgress* listener, UploadRequest* request, UploadResul
 
 Uploader::~Uploader() = default;
 
-win::Status Uploader::Upload() {
-  const win::Status status = Post();
+platform::Status Uploader::Upload() {
+  const platform::Status status = Post();
   result->hr = status;
   return status;
 }
 
 // The connection is closed when this returns, on every path; a failure leaves
 // the request abandoned, unended.
-win::Status Uploader::Post() {
+platform::Status Uploader::Post() {
   std::unique_ptr<UploadConnection> connection;
-  win::Status status = environment_.openConnection(*request, listener, &connection);
-  if (win::Failed(status)) return status;
+  platform::Status status = environment_.openConnection(*request, listener, &connection);
+  if (platform::Failed(status)) return status;
   const std::string boundary = MakeBoundary();
   status = connection->AddHeader(MakeContentTypeHeader(boundary));
-  if (win::Failed(status)) return status;
+  if (platform::Failed(status)) return status;
   std::uint64_t totalFileSize = 0;
   std::vector<std::uint64_t> fileSizes;
   const std::uint64_t length = ComputeContentLength(boundary, &totalFileSize, &fileSizes);
-  if (!FitsTheWire(length, fileSizes)) return win::StatusFromWin32(win::kErrorFileTooLarge);
+  if (!FitsTheWire(length, fileSizes)) return platform::StatusFromWin32(platform::kErrorFileTooLarge);
   status = connection->Start(static_cast<std::uint32_t>(length));
-  if (win::Failed(status)) return status;
+  if (platform::Failed(status)) return status;
   status = WriteFields(*connection, boundary);
-  if (win::Failed(status)) return status;
+  if (platform::Failed(status)) return status;
   status = WriteFiles(*connection, boundary, fileSizes, totalFileSize);
-  if (win::Failed(status)) return status;
+  if (platform::Failed(status)) return status;
   status = connection->Write(MakeClosingDelimiter(boundary));
-  if (win::Failed(status)) return status;
+  if (platform::Failed(status)) return status;
   status = connection->End();
-  if (win::Failed(status)) return status;
+  if (platform::Failed(status)) return status;
   ReadReply(*connection);
-  return win::kOk;
+  return platform::kOk;
 }
 
-win::Status Uploader::WriteFields(UploadConnection& connection, const std::string& boundary) {
-  for (const auto& [name, value] : request->FieldsSnapshot()) {
-    const win::Status status = WriteFieldPart(connection, boundary, name, value);
-    if (win::Failed(status)) return status;
+platform::Status Uploader::WriteFields(UploadConnection& connection, const std::string& boundary) {
+  for (const auto& [name, value] : request->fields) {
+    const platform::Status status = WriteFieldPart(connection, boundary, name, value);
+    if (platform::Failed(status)) return status;
   }
-  return win::kOk;
+  return platform::kOk;
 }
 
-win::Status Uploader::WriteFieldPart(UploadConnection& connection, const std::string& boundary,
+platform::Status Uploader::WriteFieldPart(UploadConnection& connection, const std::string& boundary,
                                      const std::string& name, const std::string& value) {
   for (const std::string& piece : {MakeFieldHeader(boundary, name), value, MakeLineBreak()}) {
-    const win::Status status = connection.Write(piece);
-    if (win::Failed(status)) return status;
+    const platform::Status status = connection.Write(piece);
+    if (platform::Failed(status)) return status;
   }
-  return win::kOk;
+  return platform::kOk;
 }
 
-win::Status Uploader::WriteFiles(UploadConnection& connection, const std::string& boundary,
+platform::Status Uploader::WriteFiles(UploadConnection& connection, const std::string& boundary,
                                  const std::vector<std::uint64_t>& fileSizes,
                                  std::uint64_t totalFileSize) {
   Totals totals;
   totals.size = static_cast<std::uint32_t>(totalFileSize);
-  const std::vector<UploadFile> files = request->FilesSnapshot();
+  const std::vector<UploadFile>& files = request->files;
   for (std::size_t i = 0; i < files.size(); ++i) {
     const auto size = static_cast<std::uint32_t>(fileSizes[i]);
-    const win::Status status = WriteFilePart(connection, boundary, files[i], size, totals);
-    if (win::Failed(status)) return status;
+    const platform::Status status = WriteFilePart(connection, boundary, files[i], size, totals);
+    if (platform::Failed(status)) return status;
   }
-  return win::kOk;
+  return platform::kOk;
 }
 
-win::Status Uploader::WriteFilePart(UploadConnection& connection, const std::string& boundary,
+platform::Status Uploader::WriteFilePart(UploadConnection& connection, const std::string& boundary,
                                     const UploadFile& file, std::uint32_t size, Totals& totals) {
-  win::Status status =
+  platform::Status status =
       connection.Write(MakeFileHeader(boundary, file.name, file.path, file.contentType));
-  if (win::Failed(status)) return status;
-  file::File source;
+  if (platform::Failed(status)) return status;
+  platform::File source;
   status = source.Open(file.path);
-  if (win::Failed(status)) return status;
+  if (platform::Failed(status)) return status;
   listener->OnFileBegin(file.path.c_str());
   status = StreamFile(connection, file.path, source, size, totals);
   source.Close();
   listener->OnFileComplete(file.path.c_str(), status);
-  if (win::Failed(status)) return status;
+  if (platform::Failed(status)) return status;
   return connection.Write(MakeLineBreak());
 }
 
 // Streams exactly the `size` bytes the announced length counted, in chunks that
 // adapt to the time each write takes, with progress at most once a half-second.
-win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstring& path,
-                                 file::File& source, std::uint32_t size, Totals& totals) {
+platform::Status Uploader::StreamFile(UploadConnection& connection, const std::wstring& path,
+                                 platform::File& source, std::uint32_t size, Totals& totals) {
   const wchar_t* name = path.c_str();
   Estimate estimate = Remaining(size, totals.size, request->rateEstimate);
   std::uint32_t sent = 0;
@@ -160,7 +162,7 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
   std::uint32_t lastTick = startTick;
   std::uint32_t chunk = kChunkFloor;
   char* buffer = ChunkBuffer();
-  if (buffer == nullptr) return win::StatusFromWin32(win::kErrorNotEnoughMemory);
+  if (buffer == nullptr) return platform::StatusFromWin32(platform::kErrorNotEnoughMemory);
   auto report = [&](std::uint32_t fileSent) {
     listener->OnFileProgress(name, fileSent, size, estimate.fileLeft, totals.sent, totals.size,
                              estimate.allLeft, estimate.speed);
@@ -169,13 +171,13 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
   if (listener->IsCancelled()) return UPLOAD_E_CANCELLED;
   for (;;) {
     std::size_t count = 0;
-    win::Status status = ReadNext(source, buffer, chunk, size - sent, &count);
-    if (win::Failed(status)) return status;
+    platform::Status status = ReadNext(source, buffer, chunk, size - sent, &count);
+    if (platform::Failed(status)) return status;
     if (count == 0) {
       if (sent != size) return FileChanged();
       request->rateEstimate = estimate.speed;
       report(size);
-      return win::kOk;
+      return platform::kOk;
     }
     if (sent == size) return FileChanged();
     const std::uint32_t writeStart = environment_.tickCount();
@@ -183,7 +185,7 @@ win::Status Uploader::StreamFile(UploadConnection& connection, const std::wstrin
     status = connection.Write(std::string_view(buffer, count));
     const std::uint32_t writeMs = environment_.tickCount() - writeStart;
     chunkLog_.Note(count, logStart);
-    if (win::Failed(status)) return status;
+    if (platform::Failed(status)) return status;
     chunk = NextChunkSize(chunk, writeMs);
     sent += static_cast<std::uint32_t>(count);
     totals.sent += static_cast<std::uint32_t>(count);
@@ -214,3 +216,5 @@ char* Uploader::ChunkBuffer() {
 }
 
 std::uint32_t Uploader::CurrentTick() const { return environment_.tickCount() / kMsPerTick; }
+
+}  // namespace transport

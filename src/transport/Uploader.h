@@ -16,9 +16,12 @@
 #include "transport/UploadEnvironment.h"
 #include "transport/UploadFile.h"
 
-namespace file {
+namespace platform {
 class File;
 }
+
+namespace transport {
+
 class UploadProgress;
 class UploadRequest;
 struct UploadResult;
@@ -37,7 +40,7 @@ class Uploader {
   virtual ~Uploader();
 
   // Performs the whole POST; stores the status in result->hr and returns it.
-  virtual win::Status Upload();
+  virtual platform::Status Upload();
 
   // The multipart encoding; none of it touches the network.
   std::string MakeBoundary() const;
@@ -64,16 +67,16 @@ class Uploader {
  private:
   struct Totals;
 
-  win::Status Post();
-  win::Status WriteFields(UploadConnection& connection, const std::string& boundary);
-  win::Status WriteFieldPart(UploadConnection& connection, const std::string& boundary,
+  platform::Status Post();
+  platform::Status WriteFields(UploadConnection& connection, const std::string& boundary);
+  platform::Status WriteFieldPart(UploadConnection& connection, const std::string& boundary,
                              const std::string& name, const std::string& value);
-  win::Status WriteFiles(UploadConnection& connection, const std::string& boundary,
+  platform::Status WriteFiles(UploadConnection& connection, const std::string& boundary,
                          const std::vector<std::uint64_t>& fileSizes, std::uint64_t totalFileSize);
-  win::Status WriteFilePart(UploadConnection& connection, const std::string& boundary,
+  platform::Status WriteFilePart(UploadConnection& connection, const std::string& boundary,
                             const UploadFile& file, std::uint32_t size, Totals& totals);
-  win::Status StreamFile(UploadConnection& connection, const std::wstring& path,
-                         file::File& source, std::uint32_t size, Totals& totals);
+  platform::Status StreamFile(UploadConnection& connection, const std::wstring& path,
+                         platform::File& source, std::uint32_t size, Totals& totals);
   void ReadReply(UploadConnection& connection);
   // Null when it cannot be had.
   char* ChunkBuffer();
@@ -81,5 +84,7 @@ class Uploader {
 
   UploadEnvironment environment_;
   ChunkLog chunkLog_;
-  std::optional<memory::LargeBuffer> chunkBuffer_;  // kChunkCeiling bytes, made at the first file
+  std::optional<platform::LargeBuffer> chunkBuffer_;  // kChunkCeiling bytes, made at the first file
 };
+
+}  // namespace transport

@@ -8,6 +8,8 @@
 #include "transport/UploadRequest.h"
 #include "transport/Uploader.h"
 
+namespace transport {
+
 namespace {
 
 constexpr const char* kCrlf = "\r\n";
@@ -16,14 +18,14 @@ constexpr int kBoundaryGroups = 3;
 constexpr unsigned kGroupMax = 0xFFFF;
 constexpr const char* kDisposition = "Content-Disposition: form-data; name=\"";
 
-// Names and media types go out in the thread's ANSI code page, UTF-8 here.
-std::string Narrow(const std::wstring& wide) { return text::WideToUtf8(wide); }
+// Names and media types go out in the thread's ANSI code page.
+std::string Narrow(const std::wstring& wide) { return platform::WideToAnsi(wide); }
 
 // The path, in UTF-8, as the part's file name. A quote or a line break would end
 // the quoted name or the header line early, so those three are percent-escaped.
 std::string FileNameText(const std::wstring& path) {
   std::string escaped;
-  for (const char c : text::WideToUtf8(path)) {
+  for (const char c : platform::WideToUtf8(path)) {
     switch (c) {
       case '"': escaped += "%22"; break;
       case '\r': escaped += "%0D"; break;
@@ -35,9 +37,9 @@ std::string FileNameText(const std::wstring& path) {
 }
 
 std::uint64_t MeasureFile(const std::wstring& path) {
-  file::File source;
+  platform::File source;
   std::uint64_t size = 0;
-  if (win::Failed(source.Open(path)) || win::Failed(source.Size(&size))) return 0;
+  if (platform::Failed(source.Open(path)) || platform::Failed(source.Size(&size))) return 0;
   return size;
 }
 
@@ -97,10 +99,10 @@ std::uint64_t Uploader::ComputeContentLength(const std::string& boundary,
   *totalFileSize = 0;
   fileSizes->clear();
   std::uint64_t length = 0;
-  for (const auto& [name, value] : request->FieldsSnapshot()) {
+  for (const auto& [name, value] : request->fields) {
     length += FieldPartLength(boundary, name, value);
   }
-  for (const UploadFile& file : request->FilesSnapshot()) {
+  for (const UploadFile& file : request->files) {
     std::uint64_t size = 0;
     length += FilePartLength(boundary, file, &size);
     *totalFileSize += size;
@@ -108,3 +110,5 @@ std::uint64_t Uploader::ComputeContentLength(const std::string& boundary,
   }
   return length + MakeClosingDelimiter(boundary).size();
 }
+
+}  // namespace transport

@@ -5,13 +5,15 @@
 #include "platform/window.h"
 #include "upload/UploadProgressCommands.h"
 
+namespace upload {
+
 namespace {
 
 constexpr wchar_t kWindowClass[] = L"UploadProgressProxyWindow";
 
 }  // namespace
 
-CUploadProgressProxyWindow::CUploadProgressProxyWindow(BackgroundUploadProgress* target)
+CUploadProgressProxyWindow::CUploadProgressProxyWindow(transport::BackgroundUploadProgress* target)
     : target(target) {
   WindowClassName();
 }
@@ -24,28 +26,28 @@ CUploadProgressProxyWindow::~CUploadProgressProxyWindow() {
 // Registered once for every proxy window of the process.
 const std::wstring& CUploadProgressProxyWindow::WindowClassName() {
   static const std::wstring name = [] {
-    ui::RegisterWindowClass(kWindowClass, &WindowProcedure);
+    platform::RegisterWindowClass(kWindowClass, &WindowProcedure);
     return std::wstring(kWindowClass);
   }();
   return name;
 }
 
 bool CUploadProgressProxyWindow::CreateHiddenWindow() {
-  window = ui::Window::Create(WindowClassName());
-  if (window) window->SetUserData(this);
-  return window != nullptr;
+  window_ = platform::Window::Create(WindowClassName());
+  if (window_) window_->SetUserData(this);
+  return window_ != nullptr;
 }
 
-void CUploadProgressProxyWindow::DestroyWindow() { window.reset(); }
+void CUploadProgressProxyWindow::DestroyWindow() { window_.reset(); }
 
 // The message map: WM_UPLOAD_COMMAND goes to OnUploadCommand, the rest to the
 // default processing.
-std::intptr_t CUploadProgressProxyWindow::WindowProcedure(ui::Window& window, std::uint32_t message,
+std::intptr_t CUploadProgressProxyWindow::WindowProcedure(platform::Window& window, std::uint32_t message,
                                                           std::uintptr_t wparam,
                                                           std::intptr_t lparam) {
   auto* self = static_cast<CUploadProgressProxyWindow*>(window.UserData());
   if (message == WM_UPLOAD_COMMAND && self != nullptr) return self->OnUploadCommand(wparam, lparam);
-  return ui::DefaultWindowProcedure(window, message, wparam, lparam);
+  return platform::DefaultWindowProcedure(window, message, wparam, lparam);
 }
 
 std::intptr_t CUploadProgressProxyWindow::OnUploadCommand(std::uintptr_t, std::intptr_t lparam) {
@@ -62,8 +64,8 @@ void CUploadProgressProxyWindow::DropCommand(std::intptr_t lparam) {
 // starts and destroyed only after the worker has been joined.
 // Without a window the command has nowhere to go and is freed.
 void CUploadProgressProxyWindow::PostCommand(std::unique_ptr<Command> command) {
-  if (!window) return;
-  window->Post(WM_UPLOAD_COMMAND, 0, reinterpret_cast<std::intptr_t>(command.release()),
+  if (!window_) return;
+  window_->Post(WM_UPLOAD_COMMAND, 0, reinterpret_cast<std::intptr_t>(command.release()),
                &DropCommand);
   std::this_thread::yield();
 }
@@ -81,49 +83,49 @@ void CUploadProgressProxyWindow::PostDwordCommand(DwordMethod method, std::uint3
 }
 
 void CUploadProgressProxyWindow::OnResolvingName(const wchar_t* text) {
-  PostStringCommand(&BackgroundUploadProgress::OnResolvingName, text);
+  PostStringCommand(&transport::BackgroundUploadProgress::OnResolvingName, text);
 }
 
 void CUploadProgressProxyWindow::OnNameResolved(const wchar_t* text) {
-  PostStringCommand(&BackgroundUploadProgress::OnNameResolved, text);
+  PostStringCommand(&transport::BackgroundUploadProgress::OnNameResolved, text);
 }
 
 void CUploadProgressProxyWindow::OnConnectingToServer(const wchar_t* text) {
-  PostStringCommand(&BackgroundUploadProgress::OnConnectingToServer, text);
+  PostStringCommand(&transport::BackgroundUploadProgress::OnConnectingToServer, text);
 }
 
 void CUploadProgressProxyWindow::OnConnectedToServer(const wchar_t* text) {
-  PostStringCommand(&BackgroundUploadProgress::OnConnectedToServer, text);
+  PostStringCommand(&transport::BackgroundUploadProgress::OnConnectedToServer, text);
 }
 
 void CUploadProgressProxyWindow::OnSendingRequest() {
   if (eventFilter & kForwardSendingRequest)
-    PostVoidCommand(&BackgroundUploadProgress::OnSendingRequest);
+    PostVoidCommand(&transport::BackgroundUploadProgress::OnSendingRequest);
 }
 
 void CUploadProgressProxyWindow::OnRequestSent(std::uint32_t bytes) {
   if (eventFilter & kForwardRequestSent)
-    PostDwordCommand(&BackgroundUploadProgress::OnRequestSent, bytes);
+    PostDwordCommand(&transport::BackgroundUploadProgress::OnRequestSent, bytes);
 }
 
 void CUploadProgressProxyWindow::OnReceivingResponse() {
-  PostVoidCommand(&BackgroundUploadProgress::OnReceivingResponse);
+  PostVoidCommand(&transport::BackgroundUploadProgress::OnReceivingResponse);
 }
 
 void CUploadProgressProxyWindow::OnResponseReceived(std::uint32_t bytes) {
-  PostDwordCommand(&BackgroundUploadProgress::OnResponseReceived, bytes);
+  PostDwordCommand(&transport::BackgroundUploadProgress::OnResponseReceived, bytes);
 }
 
 void CUploadProgressProxyWindow::OnClosingConnection() {
-  PostVoidCommand(&BackgroundUploadProgress::OnClosingConnection);
+  PostVoidCommand(&transport::BackgroundUploadProgress::OnClosingConnection);
 }
 
 void CUploadProgressProxyWindow::OnConnectionClosed() {
-  PostVoidCommand(&BackgroundUploadProgress::OnConnectionClosed);
+  PostVoidCommand(&transport::BackgroundUploadProgress::OnConnectionClosed);
 }
 
 void CUploadProgressProxyWindow::OnFileBegin(const wchar_t* path) {
-  PostStringCommand(&BackgroundUploadProgress::OnFileBegin, path);
+  PostStringCommand(&transport::BackgroundUploadProgress::OnFileBegin, path);
 }
 
 void CUploadProgressProxyWindow::OnFileProgress(const wchar_t* path, std::uint32_t fileSent,
@@ -142,13 +144,13 @@ void CUploadProgressProxyWindow::OnFileComplete(const wchar_t* path, std::int32_
 bool CUploadProgressProxyWindow::IsCancelled() { return target->IsCancelled(); }
 
 void CUploadProgressProxyWindow::OnReservedEvent() {
-  PostVoidCommand(&BackgroundUploadProgress::OnReservedEvent);
+  PostVoidCommand(&transport::BackgroundUploadProgress::OnReservedEvent);
 }
 
 void CUploadProgressProxyWindow::OnBackgroundUploadComplete(std::int32_t result) {
   class OnBackgroundUploadCompleteCommand : public UploadProgressCommand {
    public:
-    OnBackgroundUploadCompleteCommand(BackgroundUploadProgress* target, std::int32_t result)
+    OnBackgroundUploadCompleteCommand(transport::BackgroundUploadProgress* target, std::int32_t result)
         : UploadProgressCommand(target), result(result) {}
     void Execute() override { target->OnBackgroundUploadComplete(result); }
 
@@ -157,3 +159,5 @@ void CUploadProgressProxyWindow::OnBackgroundUploadComplete(std::int32_t result)
   };
   PostCommand(std::make_unique<OnBackgroundUploadCompleteCommand>(target, result));
 }
+
+}  // namespace upload

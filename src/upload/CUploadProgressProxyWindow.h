@@ -11,12 +11,15 @@
 #include "platform/windows_names.h"
 #include "transport/BackgroundUploadProgress.h"
 
-namespace ui {
+namespace platform {
 class Window;
 }
+
+namespace upload {
+
 class Command;
 
-class CUploadProgressProxyWindow final : public BackgroundUploadProgress {
+class CUploadProgressProxyWindow final : public transport::BackgroundUploadProgress {
  public:
   static constexpr std::uint32_t WM_UPLOAD_COMMAND = WM_APP + 42;
   // eventFilter bits: which of the two request notifications are forwarded.
@@ -25,7 +28,7 @@ class CUploadProgressProxyWindow final : public BackgroundUploadProgress {
   static constexpr std::uint32_t kForwardAll = 0xFFFFFFFFu;
 
   // Registers the process-wide window class on first use; makes no window yet.
-  explicit CUploadProgressProxyWindow(BackgroundUploadProgress* target);
+  explicit CUploadProgressProxyWindow(transport::BackgroundUploadProgress* target);
   // Destroys the window if it still exists, dropping the commands queued for it.
   ~CUploadProgressProxyWindow();
   CUploadProgressProxyWindow(const CUploadProgressProxyWindow&) = delete;
@@ -66,12 +69,12 @@ class CUploadProgressProxyWindow final : public BackgroundUploadProgress {
   std::intptr_t OnUploadCommand(std::uintptr_t wparam, std::intptr_t lparam);
 
  private:
-  using VoidMethod = void (BackgroundUploadProgress::*)();
-  using StringMethod = void (BackgroundUploadProgress::*)(const wchar_t*);
-  using DwordMethod = void (BackgroundUploadProgress::*)(std::uint32_t);
+  using VoidMethod = void (transport::BackgroundUploadProgress::*)();
+  using StringMethod = void (transport::BackgroundUploadProgress::*)(const wchar_t*);
+  using DwordMethod = void (transport::BackgroundUploadProgress::*)(std::uint32_t);
 
   static const std::wstring& WindowClassName();
-  static std::intptr_t WindowProcedure(ui::Window& window, std::uint32_t message,
+  static std::intptr_t WindowProcedure(platform::Window& window, std::uint32_t message,
                                        std::uintptr_t wparam, std::intptr_t lparam);
   static void DropCommand(std::intptr_t lparam);
 
@@ -80,7 +83,9 @@ class CUploadProgressProxyWindow final : public BackgroundUploadProgress {
   void PostStringCommand(StringMethod method, const wchar_t* text);
   void PostDwordCommand(DwordMethod method, std::uint32_t value);
 
-  BackgroundUploadProgress* target;  // not owned
+  transport::BackgroundUploadProgress* target;  // not owned
   std::uint32_t eventFilter = kForwardAll;
-  std::unique_ptr<ui::Window> window;
+  std::unique_ptr<platform::Window> window_;
 };
+
+}  // namespace upload

@@ -2,7 +2,11 @@
 // a command deletes it.
 #pragma once
 
+namespace transport {
 class BackgroundUploadProgress;
+}
+
+namespace upload {
 
 class Command {
  public:
@@ -13,7 +17,9 @@ class Command {
 // A command that calls one upload event operation on its target.
 class UploadProgressCommand : public Command {
  protected:
-  explicit UploadProgressCommand(BackgroundUploadProgress* target) : target(target) {}
+  explicit UploadProgressCommand(transport::BackgroundUploadProgress* target) : target(target) {}
 
-  BackgroundUploadProgress* target;  // not owned
+  transport::BackgroundUploadProgress* target;  // not owned
 };
+
+}  // namespace upload

@@ -7,6 +7,8 @@
 
 #include "platform/message_queue.h"
 
+namespace upload {
+
 namespace {
 
 // The interpreter's pending-call queue is small and only tried, never waited
@@ -15,7 +17,7 @@ constexpr auto kRefusedRetryDelay = std::chrono::milliseconds(1);
 
 // Pending calls run on the interpreter's main thread, so this drains its queue.
 int DrainMainThreadQueue(void*) {
-  ui::MessageQueue::DispatchPending();
+  platform::MessageQueue::DispatchPending();
   return 0;
 }
 
@@ -27,4 +29,6 @@ void ScheduleDrain() {
 
 }  // namespace
 
-void InstallPendingCallPump() { ui::MessageQueue::ForCurrentThread()->SetWakeHandler(&ScheduleDrain); }
+void InstallPendingCallPump() { platform::MessageQueue::ForCurrentThread()->SetWakeHandler(&ScheduleDrain); }
+
+}  // namespace upload

@@ -7,6 +7,8 @@
 
 #include "interpreter/GilStateGuard.h"
 
+namespace upload {
+
 PyCallback::~PyCallback() { SetCallback(nullptr); }
 
 void PyCallback::SetCallback(PyObject* callable) {
@@ -19,7 +21,7 @@ void PyCallback::SetCallback(PyObject* callable) {
 
 void PyCallback::Call(const char* format, ...) {
   if (callback == nullptr) return;
-  GilStateGuard lock;
+  interpreter::GilStateGuard lock;
   std::va_list args;
   va_start(args, format);
   PyObject* result = CallV(format, args);
@@ -51,3 +53,5 @@ PyObject* PyCallback::CallV(const char* format, std::va_list args) {
   Py_DECREF(callable);
   return result;
 }
+
+}  // namespace upload

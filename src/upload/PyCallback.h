@@ -5,6 +5,8 @@
 struct _object;
 typedef struct _object PyObject;
 
+namespace upload {
+
 // One registered Python callable, called with arguments built from a
 // Py_BuildValue format. The callable's exceptions are printed and cleared.
 class PyCallback {
@@ -29,3 +31,5 @@ class PyCallback {
  protected:
   PyObject* callback = nullptr;  // owned reference; never None
 };
+
+}  // namespace upload

@@ -4,10 +4,12 @@
 
 #include "upload/PendingCallPump.h"
 
+namespace upload {
+
 PyCallbackWnd::PyCallbackWnd(const wchar_t* className) {
   const std::wstring name = className ? className : kDefaultClassName;
-  ui::RegisterWindowClass(name, &CallbackWindowProc);  // a class made by an earlier object is reused
-  hwnd = ui::Window::Create(name);
+  platform::RegisterWindowClass(name, &CallbackWindowProc);  // a class made by an earlier object is reused
+  hwnd = platform::Window::Create(name);
   if (hwnd) hwnd->SetUserData(this);
   // Windows of this thread are served whenever the interpreter runs Python code.
   InstallPendingCallPump();
@@ -21,12 +23,14 @@ PyCallbackWnd::~PyCallbackWnd() {
 }
 
 std::intptr_t PyCallbackWnd::WindowProc(std::uint32_t message, std::uintptr_t wparam, std::intptr_t lparam) {
-  return ui::DefaultWindowProcedure(*hwnd, message, wparam, lparam);
+  return platform::DefaultWindowProcedure(*hwnd, message, wparam, lparam);
 }
 
-std::intptr_t PyCallbackWnd::CallbackWindowProc(ui::Window& window, std::uint32_t message,
+std::intptr_t PyCallbackWnd::CallbackWindowProc(platform::Window& window, std::uint32_t message,
                                                 std::uintptr_t wparam, std::intptr_t lparam) {
   auto* self = static_cast<PyCallbackWnd*>(window.UserData());
   if (self != nullptr && self->liveMark == kLiveMark) return self->WindowProc(message, wparam, lparam);
-  return ui::DefaultWindowProcedure(window, message, wparam, lparam);
+  return platform::DefaultWindowProcedure(window, message, wparam, lparam);
 }
+
+}  // namespace upload

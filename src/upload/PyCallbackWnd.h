@@ -6,6 +6,8 @@
 #include "platform/window.h"
 #include "upload/PyCallback.h"
 
+namespace upload {
+
 // A PyCallback with a hidden window owned by the constructing thread, whose
 // messages reach the virtual WindowProc.
 class PyCallbackWnd : public PyCallback {
@@ -21,10 +23,12 @@ class PyCallbackWnd : public PyCallback {
   virtual std::intptr_t WindowProc(std::uint32_t message, std::uintptr_t wparam, std::intptr_t lparam);
 
   // Forwards to the window's object while it is alive, else default processing.
-  static std::intptr_t CallbackWindowProc(ui::Window& window, std::uint32_t message,
+  static std::intptr_t CallbackWindowProc(platform::Window& window, std::uint32_t message,
                                           std::uintptr_t wparam, std::intptr_t lparam);
 
  protected:
   std::uint32_t liveMark = kLiveMark;
-  std::unique_ptr<ui::Window> hwnd;
+  std::unique_ptr<platform::Window> hwnd;
 };
+
+}  // namespace upload

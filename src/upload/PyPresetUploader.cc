@@ -14,7 +14,8 @@
 #include "platform/xml.h"
 #include "service/unescape_url.h"
 #include "transport/ChunkPause.h"
-#include "transport/WideToUtf8.h"
+
+namespace upload {
 
 namespace {
 
@@ -40,18 +41,13 @@ constexpr std::size_t kRequiredImages = 4;
 constexpr std::uint32_t kStatusClass = 100;
 constexpr std::uint32_t kSuccessClass = 2;
 
-// Narrow texts of this platform are UTF-8 in every code page.
-std::string Narrow(const wchar_t* text) { return text::WideToUtf8(text::WideView(text)); }
-
-// A field value in UTF-8; null (sent empty) when there is no text.
-std::unique_ptr<char[]> FieldValue(const wchar_t* text) {
-  char* value = nullptr;
-  if (!WideToUtf8(text, &value)) return nullptr;
-  return std::unique_ptr<char[]>(value);
-}
+// The system's narrow texts, in the ANSI code page; null gives an empty text.
+std::string Narrow(const wchar_t* text) { return platform::WideToAnsi(platform::WideView(text)); }
+// A text field's value, in UTF-8 whatever the code page; null gives an empty value.
+std::string Utf8(const wchar_t* text) { return platform::WideToUtf8(platform::WideView(text)); }
 
 // Only a regular file can be sent: a FIFO or device would hold the upload.
-bool FileGiven(const wchar_t* path) { return path != nullptr && file::IsRegularFile(path); }
+bool FileGiven(const wchar_t* path) { return path != nullptr && platform::IsRegularFile(path); }
 
 // Whole percent of the bytes sent; nothing to send counts as all sent.
 int Percentage(std::uint32_t sent, std::uint32_t total) {
@@ -63,15 +59,15 @@ int Percentage(std::uint32_t sent, std::uint32_t total) {
 // decimal digits up to ChunkPause::kLongestMs: the default, and one trace line
 // naming the refused value.
 std::uint32_t ChunkPauseFromEnvironment() {
-  const char* value = std::getenv(ChunkPause::kVariable);
-  if (value == nullptr) return ChunkPause::kDefaultMs;
-  if (const auto pause = ChunkPause::Parse(value)) return *pause;
+  const char* value = std::getenv(transport::ChunkPause::kVariable);
+  if (value == nullptr) return transport::ChunkPause::kDefaultMs;
+  if (const auto pause = transport::ChunkPause::Parse(value)) return *pause;
   // Wide first: a value that is not UTF-8 still shows, with replacement characters.
-  const std::wstring shown = text::Utf8ToWide(value);
-  TraceMessage(L"%S refused: \"%s\" is not a whole number of milliseconds from 0 to %u;"
+  const std::wstring shown = platform::Utf8ToWide(value);
+  diag::TraceMessage(L"%S refused: \"%s\" is not a whole number of milliseconds from 0 to %u;"
                L" the pause stays %u ms",
-               ChunkPause::kVariable, shown.c_str(), ChunkPause::kLongestMs, ChunkPause::kDefaultMs);
-  return ChunkPause::kDefaultMs;
+               transport::ChunkPause::kVariable, shown.c_str(), transport::ChunkPause::kLongestMs, transport::ChunkPause::kDefaultMs);
+  return transport::ChunkPause::kDefaultMs;
 }
 
 }  // namespace
@@ -84,15 +80,15 @@ PyPresetUploader::PyPresetUploader(const wchar_t* serverHost, const wchar_t* tok
       uuid(Narrow(uuid)),
       version(Narrow(version)),
       versionType(Narrow(versionType)) {
-  TraceSetPrefix(kTraceName);
+  diag::TraceSetPrefix(kTraceName);
   // After the prefix: a refused setting is traced behind this object's name.
-  chunkPauseMs = ChunkPauseFromEnvironment();
+  chunkPauseMs_ = ChunkPauseFromEnvironment();
 }
 
 PyPresetUploader::~PyPresetUploader() {
-  reports.Close();
+  reports_.Close();
   cancelRequested = true;
-  AllowThreadsGuard unlocked;  // neither the join nor the window's end needs Python
+  interpreter::AllowThreadsGuard unlocked;  // neither the join nor the window's end needs Python
   JoinWorker();
   DestroyProxyWindow();
 }
@@ -114,7 +110,7 @@ int PyPresetUploader::StartUpload(
   cancelRequested = false;
   uploadedUrl.clear();
   // An upload that ends before any status arrives must not report an earlier one's.
-  uploadResult = UploadResult{};
+  uploadResult = transport::UploadResult{};
   uploadRequest.ClearFields();
   uploadRequest.ClearFiles();
   AddTextFields(Texts{templateKey, title, category, tags, description});
@@ -125,7 +121,7 @@ int PyPresetUploader::StartUpload(
 // The reports of a window reach Python only on the interpreter's main thread,
 // and the form must not change under a running worker.
 bool PyPresetUploader::CanStartUpload(const wchar_t* presetFile, const Images& images) const {
-  if (uploadThread || !OnInterpreterMainThread()) return false;
+  if (uploadThread || !interpreter::OnInterpreterMainThread()) return false;
   if (!FileGiven(presetFile)) return false;
   for (std::size_t i = 0; i < kRequiredImages; ++i) {
     if (!FileGiven(images[i])) return false;
@@ -139,17 +135,17 @@ bool PyPresetUploader::SetUploadUrl() {
   return url.size() <= kUrlLimit && uploadRequest.SetUrl(url.c_str());
 }
 
-// Title, tags, description, category and template key: UTF-8 on this platform
-// whatever their code page.
+// Title, tags, description, category and template key go in UTF-8, the other
+// texts in the ANSI code page (the same bytes on this platform).
 void PyPresetUploader::AddTextFields(const Texts& texts) {
   uploadRequest.AddField("token", token.c_str());
-  uploadRequest.AddField("title", FieldValue(texts.title).get());
-  uploadRequest.AddField("tags", FieldValue(texts.tags).get());
-  uploadRequest.AddField("description", FieldValue(texts.description).get());
-  uploadRequest.AddField("category", FieldValue(texts.category).get());
+  uploadRequest.AddField("title", Utf8(texts.title).c_str());
+  uploadRequest.AddField("tags", Utf8(texts.tags).c_str());
+  uploadRequest.AddField("description", Utf8(texts.description).c_str());
+  uploadRequest.AddField("category", Utf8(texts.category).c_str());
   uploadRequest.AddField("templatetype", "PRESET");
   uploadRequest.AddField("PIPtype", "0");
-  uploadRequest.AddField("templateKey", FieldValue(texts.templateKey).get());
+  uploadRequest.AddField("templateKey", Utf8(texts.templateKey).c_str());
   uploadRequest.AddField("AspectRatio", "1:1");
   uploadRequest.AddField("productName", "Quillmark Lumivanta");
   uploadRequest.AddField("AP", "KRV");
@@ -177,7 +173,7 @@ bool PyPresetUploader::StartWorker() {
   if (proxyWindow->CreateHiddenWindow()) {
     uploadThread.reset(new (std::nothrow)
                            UploadThread2(&uploadRequest, &uploadResult, proxyWindow.get(),
-                                         chunkPauseMs));
+                                         chunkPauseMs_));
     if (uploadThread && uploadThread->Start()) return true;
   }
   uploadThread.reset();
@@ -189,7 +185,7 @@ bool PyPresetUploader::StartWorker() {
 std::string PyPresetUploader::JoinWorker() {
   if (!uploadThread) return {};
   {
-    AllowThreadsGuard unlocked;
+    interpreter::AllowThreadsGuard unlocked;
     uploadThread->Join();
   }
   std::string reply = uploadThread->GetReply();
@@ -206,7 +202,7 @@ void PyPresetUploader::DestroyProxyWindow() {
 void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32_t,
                                       std::uint32_t fileTimeLeft, std::uint32_t allSent,
                                       std::uint32_t allSize, std::uint32_t, std::uint32_t) {
-  const OperationGate::Pass report(reports);
+  const platform::OperationGate::Pass report(reports_);
   if (!report) return;
   Call(kProgressFormat, kReportKind, kProgressEvent, Percentage(allSent, allSize),
        static_cast<int>(fileTimeLeft));
@@ -215,9 +211,9 @@ void PyPresetUploader::OnFileProgress(const wchar_t*, std::uint32_t, std::uint32
 // Runs inside the proxy window's own command handler; the callable, called
 // last, may even destroy this object.
 void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
-  const OperationGate::Pass report(reports);
+  const platform::OperationGate::Pass report(reports_);
   if (!report) return;
-  TraceMessage(L"PyPresetUploader::OnBackgroundUploadComplete");
+  diag::TraceMessage(L"PyPresetUploader::OnBackgroundUploadComplete");
   uploadedUrl.clear();
   const std::string reply = JoinWorker();
   const std::wstring errorText = reply.empty() ? std::wstring() : ReadReply(reply);
@@ -229,11 +225,11 @@ void PyPresetUploader::OnBackgroundUploadComplete(std::int32_t) {
 // Keeps the decoded URL of the published preset; returns the server's error
 // text, whole.
 std::wstring PyPresetUploader::ReadReply(const std::string& reply) {
-  const xml::Document document(text::ValidUtf8(reply));
-  const xml::Lookup url = document.NodeText(kUrlNode);
-  if (url.found()) uploadedUrl = UnescapeUrl(url.text);
-  const xml::Lookup error = document.NodeText(kErrorNode);
-  if (error.failed()) TraceMessage(L"Upload OB fail: Can not parse errMsg from xml.");
+  const platform::xml::Document document(platform::ValidUtf8(reply));
+  const platform::xml::Lookup url = document.NodeText(kUrlNode);
+  if (url.found()) uploadedUrl = service::UnescapeUrl(url.text);
+  const platform::xml::Lookup error = document.NodeText(kErrorNode);
+  if (error.failed()) diag::TraceMessage(L"Upload OB fail: Can not parse errMsg from xml.");
   return error.found() ? error.text : std::wstring();
 }
 
@@ -245,3 +241,5 @@ bool PyPresetUploader::Succeeded() const {
 PyObject* PyPresetUploader::GetUploadedFileUrl() const {
   return Py_BuildValue("u", uploadedUrl.c_str());
 }
+
+}  // namespace upload

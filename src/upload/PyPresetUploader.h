@@ -18,7 +18,9 @@
 #include "upload/PyCallbackWnd.h"
 #include "upload/UploadThread2.h"
 
-class PyPresetUploader : public PyCallbackWnd, public BackgroundUploadProgress {
+namespace upload {
+
+class PyPresetUploader : public PyCallbackWnd, public transport::BackgroundUploadProgress {
  public:
   static constexpr std::size_t kImageCount = 12;
 
@@ -94,12 +96,12 @@ class PyPresetUploader : public PyCallbackWnd, public BackgroundUploadProgress {
   const std::string uuid;
   const std::string version;
   const std::string versionType;
-  std::uint32_t chunkPauseMs;  // read with the trace switch, at construction
+  std::uint32_t chunkPauseMs_;  // read with the trace switch, at construction
 
   std::wstring uploadedUrl;
   // Touched by the UI thread only while no worker runs, or after the join.
-  UploadRequest uploadRequest;
-  UploadResult uploadResult;
+  transport::UploadRequest uploadRequest;
+  transport::UploadResult uploadResult;
   // Both set exactly while an upload runs.
   std::unique_ptr<UploadThread2> uploadThread;
   std::unique_ptr<CUploadProgressProxyWindow> proxyWindow;
@@ -107,5 +109,7 @@ class PyPresetUploader : public PyCallbackWnd, public BackgroundUploadProgress {
   std::atomic<bool> cancelRequested{false};
   // Passed by the handling of each report, which calls Python and may release
   // the interpreter lock, so that another thread may be destroying this object.
-  OperationGate reports;
+  platform::OperationGate reports_;
 };
+
+}  // namespace upload

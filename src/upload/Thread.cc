@@ -2,6 +2,8 @@
 
 #include <system_error>
 
+namespace upload {
+
 Thread::~Thread() {
   if (handle.joinable()) handle.join();
 }
@@ -21,29 +23,31 @@ bool Thread::Start() {
 std::uint32_t Thread::ThreadEntry(Thread* thread) {
   thread->WaitAtStartGate();
   try {
-    thread->exitCode = thread->Run();
+    thread->exitCode_ = thread->Run();
   } catch (...) {
-    thread->exitCode = kRunFailed;
+    thread->exitCode_ = kRunFailed;
   }
-  return thread->exitCode;
+  return thread->exitCode_;
 }
 
 std::uint32_t Thread::Join() {
   if (!handle.joinable()) return 0;
   handle.join();
   handle = std::thread();
-  return exitCode;
+  return exitCode_;
 }
 
 void Thread::OpenStartGate() {
   {
-    std::lock_guard<std::mutex> lock(startGate.mutex);
-    startGate.open = true;
+    std::lock_guard<std::mutex> lock(startGate_.mutex);
+    startGate_.open = true;
   }
-  startGate.opened.notify_one();
+  startGate_.opened.notify_one();
 }
 
 void Thread::WaitAtStartGate() {
-  std::unique_lock<std::mutex> lock(startGate.mutex);
-  startGate.opened.wait(lock, [this] { return startGate.open; });
+  std::unique_lock<std::mutex> lock(startGate_.mutex);
+  startGate_.opened.wait(lock, [this] { return startGate_.open; });
 }
+
+}  // namespace upload

@@ -6,6 +6,8 @@
 #include <mutex>
 #include <thread>
 
+namespace upload {
+
 class Thread {
  public:
   Thread() = default;
@@ -46,6 +48,8 @@ class Thread {
 
   std::thread handle;
   std::thread::id threadId;
-  StartGate startGate;
-  std::uint32_t exitCode = 0;  // written by the thread, read after the join
+  StartGate startGate_;
+  std::uint32_t exitCode_ = 0;  // written by the thread, read after the join
 };
+
+}  // namespace upload

@@ -9,10 +9,12 @@
 #include "transport/BackgroundUploadProgress.h"
 #include "upload/Command.h"
 
+namespace upload {
+
 class VoidCommand : public UploadProgressCommand {
  public:
-  using Method = void (BackgroundUploadProgress::*)();
-  VoidCommand(BackgroundUploadProgress* target, Method method)
+  using Method = void (transport::BackgroundUploadProgress::*)();
+  VoidCommand(transport::BackgroundUploadProgress* target, Method method)
       : UploadProgressCommand(target), method(method) {}
   void Execute() override { (target->*method)(); }
 
@@ -22,9 +24,9 @@ class VoidCommand : public UploadProgressCommand {
 
 class StringCommand : public UploadProgressCommand {
  public:
-  using Method = void (BackgroundUploadProgress::*)(const wchar_t*);
-  StringCommand(BackgroundUploadProgress* target, Method method, const wchar_t* text)
-      : UploadProgressCommand(target), method(method), text(text::WideView(text)) {}
+  using Method = void (transport::BackgroundUploadProgress::*)(const wchar_t*);
+  StringCommand(transport::BackgroundUploadProgress* target, Method method, const wchar_t* text)
+      : UploadProgressCommand(target), method(method), text(platform::WideView(text)) {}
   void Execute() override { (target->*method)(text.c_str()); }
 
  private:
@@ -34,8 +36,8 @@ class StringCommand : public UploadProgressCommand {
 
 class DwordCommand : public UploadProgressCommand {
  public:
-  using Method = void (BackgroundUploadProgress::*)(std::uint32_t);
-  DwordCommand(BackgroundUploadProgress* target, Method method, std::uint32_t value)
+  using Method = void (transport::BackgroundUploadProgress::*)(std::uint32_t);
+  DwordCommand(transport::BackgroundUploadProgress* target, Method method, std::uint32_t value)
       : UploadProgressCommand(target), method(method), value(value) {}
   void Execute() override { (target->*method)(value); }
 
@@ -46,12 +48,12 @@ class DwordCommand : public UploadProgressCommand {
 
 class OnFileProgressCommand : public UploadProgressCommand {
  public:
-  OnFileProgressCommand(BackgroundUploadProgress* target, const wchar_t* path,
+  OnFileProgressCommand(transport::BackgroundUploadProgress* target, const wchar_t* path,
                         std::uint32_t fileSent, std::uint32_t fileSize, std::uint32_t fileTimeLeft,
                         std::uint32_t allSent, std::uint32_t allSize, std::uint32_t allTimeLeft,
                         std::uint32_t speed)
       : UploadProgressCommand(target),
-        path(text::WideView(path)),
+        path(platform::WideView(path)),
         fileSent(fileSent),
         fileSize(fileSize),
         fileTimeLeft(fileTimeLeft),
@@ -77,11 +79,13 @@ class OnFileProgressCommand : public UploadProgressCommand {
 
 class OnFileCompleteCommand : public UploadProgressCommand {
  public:
-  OnFileCompleteCommand(BackgroundUploadProgress* target, const wchar_t* path, std::int32_t result)
-      : UploadProgressCommand(target), path(text::WideView(path)), result(result) {}
+  OnFileCompleteCommand(transport::BackgroundUploadProgress* target, const wchar_t* path, std::int32_t result)
+      : UploadProgressCommand(target), path(platform::WideView(path)), result(result) {}
   void Execute() override { target->OnFileComplete(path.c_str(), result); }
 
  private:
   std::wstring path;
   std::int32_t result;
 };
+
+}  // namespace upload

@@ -7,13 +7,14 @@
 #include "transport/UploadResult.h"
 #include "transport/Uploader.h"
 
-UploadThread2::UploadThread2(UploadRequest* request, UploadResult* result,
-                             BackgroundUploadProgress* listener, std::uint32_t chunkPauseMs)
-    : request(request), result(result), listener(listener), chunkPauseMs(chunkPauseMs) {}
+namespace upload {
+
+UploadThread2::UploadThread2(transport::UploadRequest* request, transport::UploadResult* result,
+                             transport::BackgroundUploadProgress* listener, std::uint32_t chunkPauseMs)
+    : request(request), result(result), listener(listener), chunkPauseMs_(chunkPauseMs) {}
 
 std::uint32_t UploadThread2::Run() {
-  const win::Status status = RunUpload();
-  result->hr = status;
+  const platform::Status status = RunUpload();
   // Raised last, so that it reaches the UI thread after every other event.
   listener->OnBackgroundUploadComplete(status);
   return static_cast<std::uint32_t>(status);
@@ -21,15 +22,17 @@ std::uint32_t UploadThread2::Run() {
 
 // Memory running out on this thread fails the upload like a chunk buffer that
 // cannot be had, and the completion is still reported.
-win::Status UploadThread2::RunUpload() {
+platform::Status UploadThread2::RunUpload() {
   try {
-    UploadEnvironment environment = UploadEnvironment::Platform();
-    environment.pauseAfterChunkMs = chunkPauseMs;
-    Uploader uploader(listener, request, result, std::move(environment));
-    const win::Status status = uploader.Upload();
+    transport::UploadEnvironment environment = transport::UploadEnvironment::Platform();
+    environment.pauseAfterChunkMs = chunkPauseMs_;
+    transport::Uploader uploader(listener, request, result, std::move(environment));
+    const platform::Status status = uploader.Upload();
     reply = std::move(uploader.reply);
     return status;
   } catch (const std::bad_alloc&) {
-    return win::StatusFromWin32(win::kErrorNotEnoughMemory);
+    return platform::StatusFromWin32(platform::kErrorNotEnoughMemory);
   }
 }
+
+}  // namespace upload

@@ -8,15 +8,19 @@
 #include "platform/win_error.h"
 #include "upload/Thread.h"
 
+namespace transport {
 class BackgroundUploadProgress;
 class UploadRequest;
 struct UploadResult;
+}  // namespace transport
+
+namespace upload {
 
 class UploadThread2 : public Thread {
  public:
   // None of the three is owned; all must outlive the thread's run. The engine
   // pauses `chunkPauseMs` after each chunk.
-  UploadThread2(UploadRequest* request, UploadResult* result, BackgroundUploadProgress* listener,
+  UploadThread2(transport::UploadRequest* request, transport::UploadResult* result, transport::BackgroundUploadProgress* listener,
                 std::uint32_t chunkPauseMs);
   ~UploadThread2() override = default;
 
@@ -27,11 +31,13 @@ class UploadThread2 : public Thread {
   std::uint32_t Run() override;
 
  private:
-  win::Status RunUpload();
+  platform::Status RunUpload();
 
-  UploadRequest* request;
-  UploadResult* result;
-  BackgroundUploadProgress* listener;
-  std::uint32_t chunkPauseMs;
+  transport::UploadRequest* request;
+  transport::UploadResult* result;
+  transport::BackgroundUploadProgress* listener;
+  std::uint32_t chunkPauseMs_;
   std::string reply;
 };
+
+}  // namespace upload

@@ -51,18 +51,18 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   const std::string_view bytes(reinterpret_cast<const char*>(data), size);
   std::wstring raw(size / sizeof(wchar_t), L'\0');  // surrogates and values past U+10FFFF too
   std::memcpy(raw.data(), data, raw.size() * sizeof(wchar_t));
-  for (const std::wstring& value : {text::Utf8ToWide(bytes), raw}) {
-    const std::string utf8 = text::WideToUtf8(value);
-    Require(DecodeForm(EscapeFormValue(value)) == utf8, "a form value decodes to the UTF-8 of the text");
+  for (const std::wstring& value : {platform::Utf8ToWide(bytes), raw}) {
+    const std::string utf8 = platform::WideToUtf8(value);
+    Require(DecodeForm(service::EscapeFormValue(value)) == utf8, "a form value decodes to the UTF-8 of the text");
     const std::wstring escaped = service::EscapePathValue(value);
     std::size_t unfit = 0;
     for (const char c : utf8) unfit += static_cast<unsigned char>(c) <= ' ' || static_cast<unsigned char>(c) >= 0x7F || c == '#';
     Require(escaped.size() == utf8.size() + 2 * unfit, "a query value escapes exactly the bytes a target may not hold");
-    const std::string target = text::WideToUtf8(escaped);
+    const std::string target = platform::WideToUtf8(escaped);
     Require(FitsRequestLine(target) && target.size() == escaped.size() && target.find('#') == std::string::npos,
                   "a query value can stand in a request target");
   }
-  UploadRequest request;
+  transport::UploadRequest request;
   request.host = "earlier.example";
   request.path = "/earlier";
   if (!request.SetUrl(std::string(bytes).c_str())) {
@@ -71,9 +71,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   }
   Require(!request.host.empty() && request.host.find_first_of("/?#@") == std::string::npos &&
                     request.path[0] == '/' && FitsRequestLine(request.host) && FitsRequestLine(request.path) &&
-                    request.host.size() < url::kComponentCapacity && request.path.size() < url::kComponentCapacity,
+                    request.host.size() < platform::kUrlComponentCapacity && request.path.size() < platform::kUrlComponentCapacity,
                 "an accepted URL gives a host and an absolute path that fit a request line and their buffers");
-  UploadRequest again;
+  transport::UploadRequest again;
   Require(again.SetUrl(("http://" + request.host + request.path).c_str()) && again.host == request.host &&
                     again.path == request.path,
                 "the host and path read again the same");

@@ -19,14 +19,14 @@ constexpr const char* kPaths[] = {"info/tokenid", "INFO/SignUp", "uploadTemplate
                                   "a//b", "/info", "info/", ""};
 constexpr int kMaxWalkDepth = 200;  // the walk itself stays shallow
 
-void Walk(const xml::Document& document, const xml::Node& node, const std::string& path, int depth) {
+void Walk(const platform::xml::Document& document, const platform::xml::Node& node, const std::string& path, int depth) {
   if (depth > kMaxWalkDepth) return;
-  for (const wchar_t* name : {L"categories", L"category", L"PIP"}) ChildrenNamed(node, name);
-  for (const xml::Node& child : node.Children()) {
+  for (const wchar_t* name : {L"categories", L"category", L"PIP"}) service::ChildrenNamed(node, name);
+  for (const platform::xml::Node& child : node.Children()) {
     child.Text();
-    if (child.type() != xml::NodeType::kElement) continue;
+    if (child.type() != platform::xml::NodeType::kElement) continue;
     for (const char* attribute : {"categoryid", "id", ""}) child.Attribute(attribute);
-    const std::string childPath = (path.empty() ? "" : path + "/") + text::WideToUtf8(child.Name());
+    const std::string childPath = (path.empty() ? "" : path + "/") + platform::WideToUtf8(child.Name());
     Require(document.NodeText(childPath).found(), "an element is found by its path");
     Walk(document, child, childPath, depth + 1);
   }
@@ -39,13 +39,13 @@ void Walk(const xml::Document& document, const xml::Node& node, const std::strin
 extern "C" int LLVMFuzzerInitialize(int*, char***) {
   std::string open, close;
   for (int i = 0; i < 100000; ++i) open += "<a>", close += "</a>";
-  const xml::Document deep(service::DecodeUtf8Reply("<info><tokenid>" + open + "x" + close + "</tokenid></info>"));
+  const platform::xml::Document deep(service::DecodeUtf8Reply("<info><tokenid>" + open + "x" + close + "</tokenid></info>"));
   Require(deep.NodeText("info/tokenid").text == L"x", "a deeply nested reply is read to its innermost text");
   return 0;
 }
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
-  const xml::Document document(service::DecodeUtf8Reply(std::string(reinterpret_cast<const char*>(data), size)));
+  const platform::xml::Document document(service::DecodeUtf8Reply(std::string(reinterpret_cast<const char*>(data), size)));
   for (const char* path : kPaths) document.NodeText(path);
   Walk(document, document.Top(), "", 0);
   return 0;

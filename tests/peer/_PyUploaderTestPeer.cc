@@ -10,7 +10,7 @@
 
 namespace {
 
-using namespace binding;
+using namespace runtime;
 using CString = std::wstring;
 
 constexpr int kApiVersion = 1013;

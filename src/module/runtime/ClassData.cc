@@ -7,7 +7,7 @@
 #include "module/runtime/PyRef.h"
 #include "module/runtime/pointers.h"
 
-namespace binding {
+namespace runtime {
 
 namespace {
 
@@ -120,4 +120,4 @@ void ReleaseClassData(ClassData& data) {
   Py_CLEAR(data.klass);
 }
 
-}  // namespace binding
+}  // namespace runtime

@@ -6,7 +6,7 @@
 
 #include "module/runtime/TypeInfo.h"
 
-namespace binding {
+namespace runtime {
 
 struct ClassData {
   PyObject* klass;        // the class object
@@ -30,4 +30,4 @@ PyObject* NewShadowInstance(const ClassData& data, PyObject* pointerObject);
 // Drops the references a ClassData holds.
 void ReleaseClassData(ClassData& data);
 
-}  // namespace binding
+}  // namespace runtime

@@ -1,6 +1,6 @@
 #include "module/runtime/ModuleTypes.h"
 
-namespace binding {
+namespace runtime {
 
 ModuleTypes::ModuleTypes(std::initializer_list<TypeName> names)
     : casts_(kCastsPerType * names.size()), types_(names.size() + 1, nullptr) {
@@ -19,4 +19,4 @@ ModuleTypes::ModuleTypes(std::initializer_list<TypeName> names)
   table_.initialCasts = initialCasts_.data();
 }
 
-}  // namespace binding
+}  // namespace runtime

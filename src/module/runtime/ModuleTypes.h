@@ -8,7 +8,7 @@
 
 #include "module/runtime/TypeTable.h"
 
-namespace binding {
+namespace runtime {
 
 struct TypeName {
   const char* mangledName;
@@ -37,4 +37,4 @@ class ModuleTypes {
   TypeTable table_{};
 };
 
-}  // namespace binding
+}  // namespace runtime

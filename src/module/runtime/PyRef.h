@@ -5,7 +5,7 @@
 
 #include <utility>
 
-namespace binding {
+namespace runtime {
 
 class PyRef {
  public:
@@ -32,4 +32,4 @@ class PyRef {
   PyObject* object_ = nullptr;
 };
 
-}  // namespace binding
+}  // namespace runtime

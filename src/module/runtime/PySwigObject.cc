@@ -10,7 +10,7 @@
 #include "module/runtime/exception_barrier.h"
 #include "module/runtime/text_form.h"
 
-namespace binding {
+namespace runtime {
 
 namespace {
 
@@ -220,4 +220,4 @@ PyObject* NewPySwigObject(void* ptr, TypeInfo* type, bool own) {
 
 PyObject* PySwigObjectRepr(PyObject* object) { return ReprSlot(object); }
 
-}  // namespace binding
+}  // namespace runtime

@@ -7,7 +7,7 @@
 
 #include "module/runtime/TypeInfo.h"
 
-namespace binding {
+namespace runtime {
 
 struct PySwigObject {
   PyObject_HEAD
@@ -31,4 +31,4 @@ PyObject* NewPySwigObject(void* ptr, TypeInfo* type, bool own);
 // The text of repr(): "<Swig Object of type 'T' at 0x1234>", then the chain's.
 PyObject* PySwigObjectRepr(PyObject* object);
 
-}  // namespace binding
+}  // namespace runtime

@@ -10,7 +10,7 @@
 #include "module/runtime/exception_barrier.h"
 #include "module/runtime/text_form.h"
 
-namespace binding {
+namespace runtime {
 
 namespace {
 
@@ -105,4 +105,4 @@ PyObject* NewPySwigPacked(const void* data, size_t size, TypeInfo* type) {
   return reinterpret_cast<PyObject*>(packed);
 }
 
-}  // namespace binding
+}  // namespace runtime

@@ -9,7 +9,7 @@
 
 #include "module/runtime/TypeInfo.h"
 
-namespace binding {
+namespace runtime {
 
 struct PySwigPacked {
   PyObject_HEAD
@@ -24,4 +24,4 @@ bool IsPySwigPacked(PyObject* object);
 // A packed object holding a copy of `size` bytes at `data`.
 PyObject* NewPySwigPacked(const void* data, size_t size, TypeInfo* type);
 
-}  // namespace binding
+}  // namespace runtime

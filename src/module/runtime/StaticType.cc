@@ -2,7 +2,7 @@
 
 #include <cstring>
 
-namespace binding {
+namespace runtime {
 
 namespace {
 
@@ -33,4 +33,4 @@ bool IsCompatibleType(PyTypeObject* candidate, PyTypeObject* ours) {
          candidate->tp_basicsize == ours->tp_basicsize;
 }
 
-}  // namespace binding
+}  // namespace runtime

@@ -5,7 +5,7 @@
 
 #include <Python.h>
 
-namespace binding {
+namespace runtime {
 
 class StaticType {
  public:
@@ -30,4 +30,4 @@ class StaticType {
 // of the same basic size.
 bool IsCompatibleType(PyTypeObject* candidate, PyTypeObject* ours);
 
-}  // namespace binding
+}  // namespace runtime

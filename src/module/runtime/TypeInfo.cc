@@ -2,7 +2,7 @@
 
 #include <cstring>
 
-namespace binding {
+namespace runtime {
 
 const char* DisplayName(const TypeInfo& type) {
   if (!type.prettyNames) return type.mangledName;
@@ -48,4 +48,4 @@ void PushCastFront(TypeInfo& type, CastInfo& cast) {
   type.casts = &cast;
 }
 
-}  // namespace binding
+}  // namespace runtime

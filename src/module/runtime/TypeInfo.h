@@ -2,7 +2,7 @@
 // The field order is a binary layout: other modules of the ring read these records.
 #pragma once
 
-namespace binding {
+namespace runtime {
 
 struct CastInfo;
 struct ClassData;
@@ -41,4 +41,4 @@ bool AcceptsName(const TypeInfo& type, const char* mangledName);
 
 void PushCastFront(TypeInfo& type, CastInfo& cast);
 
-}  // namespace binding
+}  // namespace runtime

@@ -7,7 +7,7 @@
 #include "module/runtime/ClassData.h"
 #include "module/runtime/pointers.h"
 
-namespace binding {
+namespace runtime {
 
 namespace {
 
@@ -175,4 +175,4 @@ TypeInfo* TypeQuery(const char* name) {
   return nullptr;
 }
 
-}  // namespace binding
+}  // namespace runtime

@@ -8,7 +8,7 @@
 
 #include "module/runtime/TypeInfo.h"
 
-namespace binding {
+namespace runtime {
 
 struct TypeTable {
   TypeInfo** types;          // sorted by mangled name, null after the last
@@ -26,4 +26,4 @@ void InitializeTypeTable(TypeTable& table);
 // module's, else one whose C spelling ("char *") matches, blanks ignored; null if none.
 TypeInfo* TypeQuery(const char* name);
 
-}  // namespace binding
+}  // namespace runtime

@@ -15,7 +15,7 @@
 #include "module/runtime/pointers.h"
 #include "module/runtime/status.h"
 
-namespace binding {
+namespace runtime {
 
 // What a None (null) pointer argument does.
 enum class OnNull {
@@ -155,4 +155,4 @@ struct ObjectKind : NeverSkips {
 };
 inline ObjectKind Object() { return {}; }
 
-}  // namespace binding
+}  // namespace runtime

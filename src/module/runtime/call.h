@@ -29,7 +29,7 @@
 #include "module/runtime/exception_barrier.h"
 #include "module/runtime/result_kinds.h"
 
-namespace binding {
+namespace runtime {
 
 namespace call_detail {
 
@@ -87,4 +87,4 @@ inline PyObject* Register(PyObject* args, TypeInfo* type) {
   });
 }
 
-}  // namespace binding
+}  // namespace runtime

@@ -8,7 +8,7 @@
 #include "module/runtime/pointers.h"
 #include "module/runtime/status.h"
 
-namespace binding {
+namespace runtime {
 
 namespace {
 
@@ -158,4 +158,4 @@ PyObject* FromUnsigned(uint32_t value) {
   return PyLong_FromUnsignedLong(value);
 }
 
-}  // namespace binding
+}  // namespace runtime

@@ -12,7 +12,7 @@
 #include <string>
 #include <string_view>
 
-namespace binding {
+namespace runtime {
 
 // 'wchar_t const *': a `unicode` or `str` is copied into a new zero-terminated array
 // (free it with delete[]) and the mark becomes NEWOBJ; a "wchar_t *" pointer object or
@@ -46,4 +46,4 @@ PyObject* FromWideMap(const std::map<std::wstring, std::wstring>& items);
 // An `int` below 0x80000000, a `long` from there on.
 PyObject* FromUnsigned(uint32_t value);
 
-}  // namespace binding
+}  // namespace runtime

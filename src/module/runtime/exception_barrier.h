@@ -11,7 +11,7 @@
 #include <exception>
 #include <new>
 
-namespace binding {
+namespace runtime {
 
 inline constexpr char kUnknownExceptionText[] = "unknown C++ exception";
 
@@ -38,4 +38,4 @@ Result RaiseOnException(Result failed, const Body& body) noexcept {
   }
 }
 
-}  // namespace binding
+}  // namespace runtime

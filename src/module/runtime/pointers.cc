@@ -4,7 +4,7 @@
 #include "module/runtime/PySwigObject.h"
 #include "module/runtime/status.h"
 
-namespace binding {
+namespace runtime {
 
 namespace {
 
@@ -89,4 +89,4 @@ PyObject* NewPointerObject(void* address, TypeInfo* type, int flags) {
   return pointerObject.release();
 }
 
-}  // namespace binding
+}  // namespace runtime

@@ -8,7 +8,7 @@
 #include "module/runtime/TypeInfo.h"
 #include "module/runtime/status.h"
 
-namespace binding {
+namespace runtime {
 
 // The string "this", made once and kept (borrowed reference).
 PyObject* ThisName();
@@ -29,4 +29,4 @@ int ConvertPointer(PyObject* object, void** address, TypeInfo* expected, int fla
 // an instance of the class registered for `type` unless POINTER_NOSHADOW is given.
 PyObject* NewPointerObject(void* address, TypeInfo* type, int flags);
 
-}  // namespace binding
+}  // namespace runtime

@@ -14,7 +14,7 @@
 #include "module/runtime/conversions.h"
 #include "module/runtime/pointers.h"
 
-namespace binding {
+namespace runtime {
 
 // None, whatever the operation returns.
 struct ReturnsNone {};
@@ -72,4 +72,4 @@ struct NewPointerKind {
 };
 inline NewPointerKind NewPointer(TypeInfo* type, int flags) { return NewPointerKind{type, flags}; }
 
-}  // namespace binding
+}  // namespace runtime

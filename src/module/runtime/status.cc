@@ -1,6 +1,6 @@
 #include "module/runtime/status.h"
 
-namespace binding {
+namespace runtime {
 
 PyObject* ErrorTypeForCode(int code) {
   switch (code) {
@@ -29,4 +29,4 @@ void RaiseNullReference(const char* function, int position, const char* cType) {
                function, position, cType);
 }
 
-}  // namespace binding
+}  // namespace runtime

@@ -3,7 +3,7 @@
 
 #include <Python.h>
 
-namespace binding {
+namespace runtime {
 
 // Results of a conversion.
 constexpr int STATUS_OK = 0;
@@ -28,4 +28,4 @@ void RaiseArgumentError(int status, const char* function, int position, const ch
 // ValueError: "invalid null reference in method 'NAME', argument N of type 'TYPE'".
 void RaiseNullReference(const char* function, int position, const char* cType);
 
-}  // namespace binding
+}  // namespace runtime

@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <cstdio>
 
-namespace binding {
+namespace runtime {
 
 std::string FormatAddress(const char* format, const void* address) {
   char text[32];  // 22 octal digits hold any 64-bit address
@@ -23,4 +23,4 @@ std::string PackBytes(const void* data, size_t size) {
   return packed;
 }
 
-}  // namespace binding
+}  // namespace runtime

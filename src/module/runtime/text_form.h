@@ -4,7 +4,7 @@
 #include <cstddef>
 #include <string>
 
-namespace binding {
+namespace runtime {
 
 // An address printed with a printf conversion for uintptr_t ("%" PRIxPTR).
 std::string FormatAddress(const char* format, const void* address);
@@ -12,4 +12,4 @@ std::string FormatAddress(const char* format, const void* address);
 // Each byte in memory order as two lower-case hexadecimal digits, high digit first.
 std::string PackBytes(const void* data, size_t size);
 
-}  // namespace binding
+}  // namespace runtime

@@ -3,17 +3,19 @@
 #include <gtest/gtest.h>
 
 #include <cstdarg>
+#include <fstream>
 
+#include "platform/ascii.h"
 #include "platform/registry.h"
 #include "platform/text.h"
 #include "platform/wide_format.h"
 #include "platform/xml.h"
-#include "support/fixtures.h"
+#include "fixtures.h"
 
 namespace {
 
-using namespace std::string_literals;
-using Outcome = xml::Lookup::Outcome;
+using namespace std::literals;
+using Outcome = platform::xml::Lookup::Outcome;
 
 TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
   struct Case {
@@ -37,22 +39,22 @@ TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
       {L"<a><b>x</b></a>", "a//b", Outcome::kFailed, L""},
   };
   for (const Case& c : cases) {
-    const xml::Lookup lookup = xml::Document(c.text).NodeText(c.path);
+    const platform::xml::Lookup lookup = platform::xml::Document(c.text).NodeText(c.path);
     EXPECT_EQ((std::pair{lookup.outcome, lookup.text}), (std::pair{c.outcome, c.found})) << c.path;
   }
-  EXPECT_TRUE(xml::Document().empty());
-  xml::Document first(std::string("<a>x</a>"));  // short enough to live inside a string object
-  const xml::Document moved(std::move(first));
-  first = xml::Document(std::string("<b>y</b>"));  // takes the first one's place
+  EXPECT_TRUE(platform::xml::Document().empty());
+  platform::xml::Document first(std::string("<a>x</a>"));  // short enough to live inside a string object
+  const platform::xml::Document moved(std::move(first));
+  first = platform::xml::Document(std::string("<b>y</b>"));  // takes the first one's place
   EXPECT_EQ(moved.NodeText("a").text, L"x") << "a moved document reads its own text";
   // A node record takes 64 bytes: a quarter of the bound's count is read, the whole count is not.
   auto elements = [](std::size_t count) {
     std::string text = "<a>";
     for (std::size_t i = 0; i < count; ++i) text += "<b/>";
-    return xml::Document(text + "</a>").empty();
+    return platform::xml::Document(text + "</a>").empty();
   };
-  EXPECT_EQ((std::pair{elements(xml::kMaxTreeBytes / 256), elements(xml::kMaxTreeBytes / 64)}), (std::pair{false, true}));
-  EXPECT_TRUE(xml::Document(L"<a><b></a>").Top().Children().empty());
+  EXPECT_EQ((std::pair{elements(platform::xml::kMaxTreeBytes / 256), elements(platform::xml::kMaxTreeBytes / 64)}), (std::pair{false, true}));
+  EXPECT_TRUE(platform::xml::Document(L"<a><b></a>").Top().Children().empty());
 }
 
 const std::string kHeader = "Windows Registry Editor Version 5.00\r\n\r\n";
@@ -80,7 +82,7 @@ TEST(RegistryHive, TheSwitchIsReadAsAThirtyTwoBitNumberInEveryFormTheEditorWrite
       {"\xEF\xBB\xBF" + kHeader + kSection + "\"DumpMsg\"=dword:4\n", 4},
       {Utf16LeWithMark(kHeader + kSection + "\"DumpMsg\"=dword:00000009\r\n"), 9}};
   for (const auto& [file, number] : cases) {
-    const auto key = registry::Key::OpenInHiveFile(file, kSubkey);
+    const auto key = platform::RegistryKey::OpenInHiveFile(file, kSubkey);
     ASSERT_TRUE(key.has_value()) << file;
     EXPECT_EQ(key->ReadNumber(L"DumpMsg"), number) << file;
   }
@@ -91,20 +93,20 @@ TEST(RegistryHive, TheSwitchIsReadAsAThirtyTwoBitNumberInEveryFormTheEditorWrite
            {kHeader + "[HKEY_CURRENT_USER\\SOFTWARE\\Quillmark\\Lumivanta]\n", false},
            {kHeader + "[-HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\n", false},
            {kSection + "\"DumpMsg\"=dword:1\n", false}, {"", false}}) {
-    EXPECT_EQ(registry::Key::OpenInHiveFile(file, kSubkey).has_value(), opens) << file;
+    EXPECT_EQ(platform::RegistryKey::OpenInHiveFile(file, kSubkey).has_value(), opens) << file;
   }
 }
 
 TEST(RegistryHive, IsTheFileNamedByTheEnvironmentElseTheDefaultPath) {
   {
-    test_support::ScopedEnv unset(registry::kHivePathVariable, std::nullopt);
-    EXPECT_EQ(registry::HivePath(), registry::kDefaultHivePath);
+    test_support::ScopedEnv unset(platform::kHivePathVariable, std::nullopt);
+    EXPECT_EQ(platform::HivePath(), platform::kDefaultHivePath);
   }
   const std::string path = std::filesystem::temp_directory_path() / ("hive_" + std::to_string(::getpid()));
-  test_support::ScopedEnv env(registry::kHivePathVariable, path);
-  EXPECT_FALSE(registry::Key::OpenLocalMachine(kSubkey).has_value()) << "no file yet";
+  test_support::ScopedEnv env(platform::kHivePathVariable, path);
+  EXPECT_FALSE(platform::RegistryKey::OpenLocalMachine(kSubkey).has_value()) << "no file yet";
   std::ofstream(path) << kHeader + kSection + "\"DumpMsg\"=dword:00000005\n";
-  const auto key = registry::Key::OpenLocalMachine(kSubkey);
+  const auto key = platform::RegistryKey::OpenLocalMachine(kSubkey);
   std::filesystem::remove(path);
   ASSERT_TRUE(key.has_value());
   EXPECT_EQ(key->ReadNumber(L"DumpMsg"), 5u);
@@ -113,25 +115,41 @@ TEST(RegistryHive, IsTheFileNamedByTheEnvironmentElseTheDefaultPath) {
 TEST(Utf8, DecodesOrReplacesEachSequenceAndEncodesEveryPlane) {
   for (const auto& [bytes, wide] : std::vector<std::pair<std::string, std::wstring>>{
            {"a\xC3\xA4\xE4\xB8\xAD\xF0\x9F\x98\x80", L"a\u00E4\u4E2D\U0001F600"}, {"a\0b"s, L"a\0b"s}}) {
-    EXPECT_EQ(text::Utf8ToWide(bytes), wide);
-    EXPECT_EQ(text::WideToUtf8(wide), bytes);
+    EXPECT_EQ(platform::Utf8ToWide(bytes), wide);
+    EXPECT_EQ(platform::WideToUtf8(wide), bytes);
   }
-  EXPECT_EQ(text::Utf8ToWide("\xFF\xC3"), L"\uFFFD\uFFFD");
-  EXPECT_EQ(text::WideToUtf8(std::wstring(1, static_cast<wchar_t>(0xD800))), "\xEF\xBF\xBD");
+  EXPECT_EQ(platform::Utf8ToWide("\xFF\xC3"), L"\uFFFD\uFFFD");
+  EXPECT_EQ(platform::WideToUtf8(std::wstring(1, static_cast<wchar_t>(0xD800))), "\xEF\xBF\xBD");
+}
+
+// Only A-Z and a-z have a case and only space, tab, CR and LF are blanks, in any
+// locale; a NUL inside a name is compared like any other character.
+TEST(Ascii, FoldsTheCaseOfAsciiLettersOnlyAndTrimsBlanksOnly) {
+  for (const auto& [a, b, same] : std::vector<std::tuple<std::string, std::string, bool>>{
+           {"Content-TYPE", "content-type", true}, {"", "", true}, {"a\0B"s, "A\0b"s, true},
+           {"a\0x"s, "a\0y"s, false}, {"ab", "abc", false}, {"[", "{", false}, {"\xC4", "\xE4", false}})
+    EXPECT_EQ(platform::EqualIgnoringCase(a, b), same) << a;
+  EXPECT_EQ((std::tuple{platform::Lowered(L"\u00C4BZ[@"), platform::Trim(" \t\r\na b\n"), platform::Trim(L"\v x\u00A0 ")}),
+            (std::tuple{L"\u00C4bz[@"s, "a b"sv, L"\v x\u00A0"sv}));
+  EXPECT_EQ((std::pair{platform::UpToNul("ab\0c"sv), platform::UpToNul(L"abc"sv)}), (std::pair{"ab"sv, L"abc"sv}));
+  std::wstring seen;  // per character: its value as a hex digit or "-", then "+" for a letter or digit
+  for (const wchar_t c : L"09afAF/:@G`gZ{\u00E4"sv)
+    seen += {platform::HexDigitValue(c) ? L"0123456789abcdef"[*platform::HexDigitValue(c)] : L'-', platform::IsLetterOrDigit(c) ? L'+' : L'-'};
+  EXPECT_EQ(seen, L"0+9+a+f+a+f+-------+---+-+----");
 }
 
 std::wstring Format(std::size_t capacity, const wchar_t* format, ...) {
   std::wstring buffer(capacity, L'?');
   va_list args;
   va_start(args, format);
-  const std::size_t length = wide_format::FormatCut(buffer.data(), capacity, format, args);
+  const std::size_t length = platform::FormatCut(buffer.data(), capacity, format, args);
   va_end(args);
   EXPECT_EQ(buffer[length], L'\0');
   return buffer.substr(0, length);
 }
 
 TEST(WideFormat, KeepsTheWindowsMeaningOfTextConversionsAndCutsWhatDoesNotFit) {
-  EXPECT_EQ(wide_format::TranslateFormat(L"%s|%S|%c%C|%hs|%ws|%lS|%-10s|%*.*S|%%s %d %5.2f %lu %p|%-5"),
+  EXPECT_EQ(platform::TranslateFormat(L"%s|%S|%c%C|%hs|%ws|%lS|%-10s|%*.*S|%%s %d %5.2f %lu %p|%-5"),
             L"%ls|%s|%lc%c|%s|%ls|%ls|%-10ls|%*.*s|%%s %d %5.2f %lu %p|%-5");
   EXPECT_EQ(Format(64, L"%s|%S|%c|%C|%d", L"w\u00E4\U0001F600", "n\xC3\xA4", L'\u4E2D', 'x', -7),
             L"w\u00E4\U0001F600|n\u00E4|\u4E2D|x|-7");

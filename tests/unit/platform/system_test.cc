@@ -6,14 +6,17 @@
 
 #include <algorithm>
 #include <cstring>
+#include <fstream>
+#include <iterator>
 #include <set>
 #include <sstream>
 
 #include "diag/trace.h"
+#include "fixtures.h"
 #include "platform/debug_output.h"
 #include "platform/large_buffer.h"
+#include "platform/registry.h"
 #include "platform/shell.h"
-#include "support/fixtures.h"
 
 namespace {
 
@@ -21,11 +24,38 @@ using namespace test_support;
 using Argv = std::vector<std::string>;
 constexpr auto kPatience = std::chrono::seconds(20);  // only bounds a hang
 
+std::string ReadFile(const std::filesystem::path& path) {
+  std::ifstream in(path, std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+}
+
+// A hive file holding the trace switch, and the trace lines captured in a
+// file; make it before the object under test, which reads the switch.
+class TraceCapture {
+ public:
+  TraceCapture()
+      : folder_(std::filesystem::temp_directory_path() / ("trace_" + std::to_string(::getpid()))),
+        hiveEnv_(platform::kHivePathVariable, (folder_ / "hive.reg").string()),
+        outputEnv_(platform::kDebugOutputPathVariable, (folder_ / "out.log").string()) {
+    std::filesystem::create_directories(folder_);
+    SetSwitch(1);
+  }
+  ~TraceCapture() { std::filesystem::remove_all(folder_); }
+  void SetSwitch(int dumpMsg) const { Hive("[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n\"DumpMsg\"=dword:" + std::to_string(dumpMsg)); }
+  void RemoveKey() const { Hive(""); }  // the key cannot be opened
+  std::string Bytes() const { return ReadFile(folder_ / "out.log"); }
+
+ private:
+  void Hive(const std::string& key) const { std::ofstream(folder_ / "hive.reg") << "REGEDIT4\r\n\r\n" << key << "\r\n"; }
+  std::filesystem::path folder_;
+  ScopedEnv hiveEnv_, outputEnv_;
+};
+
 // The mapping is trimmed to an aligned range: a wrong trim would leave part of
 // a buffer unmapped (a crash when written) or let two buffers overlap.
 TEST(LargeBuffer, EveryByteIsWritableAndBuffersDoNotOverlap) {
   for (const std::size_t size : {std::size_t{1}, std::size_t{2} << 20, (std::size_t{16} << 20) + 1}) {
-    memory::LargeBuffer first(size), second(size);
+    platform::LargeBuffer first(size), second(size);
     ASSERT_TRUE(first.data() && second.data());
     std::memset(first.data(), 'a', size);
     std::memset(second.data(), 'b', size);
@@ -78,7 +108,7 @@ TEST_F(Links, TheFirstBrowserCommandThatRunsGetsTheLinkAndNoShellReadsIt) {
            {"R 100%% %s", {"100%", "L"}}, {"no-such-browser %s::R", {"L"}}}) {
     std::filesystem::remove(recorder + ".out");
     ScopedEnv env("BROWSER", Substitute(browser, "R", recorder));
-    ASSERT_TRUE(shell::OpenLink(std::wstring(link.begin(), link.end())));
+    ASSERT_TRUE(platform::OpenLink(std::wstring(link.begin(), link.end())));
     Argv wanted;
     for (const std::string& arg : expected) wanted.push_back(Substitute(arg, "L", link));
     EXPECT_EQ(RecordedArgs(recorder), wanted) << browser;
@@ -105,10 +135,10 @@ TEST_F(Links, OnlyWebLinksGoToXdgOpenWhichIsReapedAndNoHandlerIsAFailure) {
   const std::string opener = Recorder("xdg-open");
   for (const wchar_t* link : {L"file:///etc/passwd", L"javascript:alert(1)", L"ftp://h/x", L"", L"http://",
                               L"-http://h", L"httpx://h", L"http://h/\na", L"http://h/\x7F"}) {
-    EXPECT_FALSE(shell::OpenLink(link)) << link;
+    EXPECT_FALSE(platform::OpenLink(link)) << link;
   }
   EXPECT_FALSE(std::filesystem::exists(opener + ".out"));
-  ASSERT_TRUE(shell::OpenLink(L"HTTPS://www.orbishare.com/\u00E4"));
+  ASSERT_TRUE(platform::OpenLink(L"HTTPS://www.orbishare.com/\u00E4"));
   EXPECT_EQ(RecordedArgs(opener), Argv{"HTTPS://www.orbishare.com/\xC3\xA4"});
   const auto deadline = std::chrono::steady_clock::now() + kPatience;
   while (ChildProcesses() > 0 && std::chrono::steady_clock::now() < deadline) {
@@ -117,7 +147,7 @@ TEST_F(Links, OnlyWebLinksGoToXdgOpenWhichIsReapedAndNoHandlerIsAFailure) {
   EXPECT_EQ(ChildProcesses(), 0) << "a zombie is left";
   std::filesystem::remove(opener);
   ScopedEnv none("BROWSER", std::string("no-such-browser:also-missing %s"));
-  EXPECT_FALSE(shell::OpenLink(L"http://www.orbishare.com/"));
+  EXPECT_FALSE(platform::OpenLink(L"http://www.orbishare.com/"));
 }
 
 // Lines from many threads stay whole; each is appended in UTF-8.
@@ -126,7 +156,7 @@ TEST(DebugOutput, LinesStayWholeFromManyThreads) {
   std::vector<std::thread> writers;
   for (int t = 0; t < 4; ++t) {
     writers.emplace_back([t] {
-      for (int i = 0; i < 200; ++i) debug_output::Write(std::to_wstring(t * 1000 + i) + std::wstring(300, L'\u00E4') + L"\n");
+      for (int i = 0; i < 200; ++i) platform::WriteDebugOutput(std::to_wstring(t * 1000 + i) + std::wstring(300, L'\u00E4') + L"\n");
     });
   }
   for (auto& w : writers) w.join();
@@ -140,21 +170,21 @@ TEST(DebugOutput, LinesStayWholeFromManyThreads) {
 
 TEST(Trace, AnUnopenableKeyKeepsTheStateAndLongNamesKeepThePrefix) {
   TraceCapture capture;
-  TraceSetPrefix("First");
+  diag::TraceSetPrefix("First");
   capture.RemoveKey();
-  TraceSetPrefix("Second");
-  TraceMessage(L"still on");
+  diag::TraceSetPrefix("Second");
+  diag::TraceMessage(L"still on");
   capture.SetSwitch(1);
   for (const char* name : std::vector<const char*>{"", nullptr, "ABCDEFGHIJKLMNOPQRSTUVWXYZ012", "ABCDEFGHIJKLMNOPQRSTUVWXYZ0123"}) {
-    TraceSetPrefix(name);
-    TraceMessage(L"x");
+    diag::TraceSetPrefix(name);
+    diag::TraceMessage(L"x");
   }
-  TraceMessage(L"KRV version = %s; host %S; %d%%", L"5.0 \u00E4", "n\xC3\xA4", 7);
+  diag::TraceMessage(L"KRV version = %s; host %S; %d%%", L"5.0 \u00E4", "n\xC3\xA4", 7);
   capture.SetSwitch(0);
-  TraceSetPrefix("Third");
+  diag::TraceSetPrefix("Third");
   capture.RemoveKey();
-  TraceSetPrefix("Fourth");
-  TraceMessage(L"still off");
+  diag::TraceSetPrefix("Fourth");
+  diag::TraceMessage(L"still off");
   EXPECT_EQ(capture.Bytes(), "[First]still on\n[]x\n[]x\n[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
                              "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
                              "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01KRV version = 5.0 \xC3\xA4; host n\xC3\xA4; 7%\n");

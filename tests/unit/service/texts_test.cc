@@ -5,12 +5,12 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <thread>
 
 #include "service/OBLoginData.h"
 #include "service/escape_form_value.h"
 #include "service/exchange.h"
 #include "service/unescape_url.h"
-#include "support/fixtures.h"
 
 namespace {
 
@@ -28,7 +28,7 @@ TEST(Escapes, QueryValuesKeepTheirSeparatorsAndFormValuesKeepTheSixFields) {
       {L"\n\x01\x7F", L"%0a%01%7f"},
       {L" \"#$&+,;<=>?@[\\]^`{|}", L"%20%22%23%24%26%2b%2c%3b%3c%3d%3e%3f%40%5b%5c%5d%5e%60%7b%7c%7d"},
       {L"Az09!'()*-./:_~", L"Az09!'()*-./:_~"}};
-  for (const auto& [value, escaped] : form) EXPECT_EQ(EscapeFormValue(value), escaped);
+  for (const auto& [value, escaped] : form) EXPECT_EQ(service::EscapeFormValue(value), escaped);
 }
 
 TEST(Decoding, RepliesEndAtTheirFirstZeroAndLinksDecodeEachEscapeIntoOneCharacter) {
@@ -42,19 +42,18 @@ TEST(Decoding, RepliesEndAtTheirFirstZeroAndLinksDecodeEachEscapeIntoOneCharacte
       // A "%" among the last two characters is no escape; the text ends at a zero.
       {L"ab%", L"ab%"}, {L"ab%4", L"ab%4"}, {L"%41%4", L"A%4"}, {L"ab%41", L"abA"},
       {L"a%4\0" L"1b"s, L"a%4"}, {L"ab\0%41"s, L"ab"}};
-  for (const auto& [link, decoded] : links) EXPECT_EQ(UnescapeUrl(link), decoded);
+  for (const auto& [link, decoded] : links) EXPECT_EQ(service::UnescapeUrl(link), decoded);
   std::wstring text, expected;
   for (int i = 0; i < 1000; ++i) text += L"%41bcd", expected += L"Abcd";
-  EXPECT_EQ(UnescapeUrl(text), expected);
+  EXPECT_EQ(service::UnescapeUrl(text), expected);
   const std::wstring cut = std::wstring(4998, L'y') + L"%4";  // its exact size: a sanitizer sees an overread
   const std::unique_ptr<wchar_t[]> exact(new wchar_t[cut.size()]);
   std::copy(cut.begin(), cut.end(), exact.get());
-  EXPECT_EQ(UnescapeUrl(std::wstring_view(exact.get(), cut.size())), cut);
+  EXPECT_EQ(service::UnescapeUrl(std::wstring_view(exact.get(), cut.size())), cut);
 }
 
 TEST(SessionToken, AReaderRacingAWriterSeesTheOldOrTheNewTokenNeverAMixture) {
-  test_support::StartPython();
-  OBLoginData session(L"5.0", L"", L"");
+  service::OBLoginData session(L"5.0", L"", L"");
   const std::wstring tokens[] = {std::wstring(200, L'A'), std::wstring(7, L'b')};
   session.SetLoginTokenID(tokens[0]);
   std::atomic<bool> stop{false};

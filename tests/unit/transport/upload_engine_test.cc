@@ -1,11 +1,16 @@
-// The upload form, its URL rules, the byte-exact multipart body and the engine's
-// timing, progress, cancel and file faults, against a recording connection.
+// The upload form, its URL rules, the byte-exact multipart body, the engine's
+// timing, progress, cancel and file faults against a recording connection, and
+// the chunk pause setting.
 #include <gtest/gtest.h>
 
+#include <fstream>
 #include <regex>
 
-#include "support/fixtures.h"
+#include "fixtures.h"
 #include "transport/ChunkPause.h"
+#include "transport/UploadConnection.h"
+#include "transport/UploadEnvironment.h"
+#include "transport/UploadProgress.h"
 #include "transport/UploadRequest.h"
 #include "transport/UploadResult.h"
 #include "transport/UploadStatus.h"
@@ -17,6 +22,69 @@ using namespace test_support;
 using Lines = std::vector<std::string>;
 constexpr std::uint32_t KiB = 1024, MiB = 1024 * KiB;
 constexpr std::size_t kHeaderSizeBelow = 1024;  // pieces this small are part headers
+
+std::filesystem::path Native(const std::wstring& name) { return std::filesystem::u8path(platform::WideToUtf8(name)); }
+
+std::wstring MakeFile(const std::wstring& name, const std::string& bytes) {
+  return std::ofstream(Native(name), std::ios::binary) << bytes, name;
+}
+
+// A file of that size that reads as zeros, without taking the disk space.
+std::wstring MakeSparseFile(const std::wstring& name, std::uintmax_t size) {
+  std::filesystem::resize_file(Native(MakeFile(name, "")), size);
+  return name;
+}
+
+// The engine's surroundings: a clock that moves only when the engine sleeps or
+// writes, and a connection that records every piece and answers as scripted.
+struct FakeServer {
+  std::uint32_t now = 1000;  // milliseconds
+  std::function<std::uint32_t(std::size_t bytes)> writeMs = [](std::size_t) { return 0u; };
+  std::function<void()> onStart = [] {};
+
+  std::vector<std::string> headers, writes;
+  std::vector<std::uint32_t> sleeps;  // milliseconds of each
+  bool started = false, ended = false;
+  std::uint32_t announced = 0;
+
+  std::string Body() const {
+    std::string body;
+    for (const std::string& piece : writes) body += piece;
+    return body;
+  }
+  std::string Boundary() const { return headers.at(0).substr(headers.at(0).find("boundary=") + 9); }
+
+  transport::UploadEnvironment Environment() {
+    return transport::UploadEnvironment{[this] { return now; }, [this](std::uint32_t ms) { sleeps.push_back(ms), now += ms; },
+                             [this](const transport::UploadRequest&, transport::UploadProgress*, std::unique_ptr<transport::UploadConnection>* out) {
+                               *out = std::make_unique<Connection>(*this);
+                               return platform::kOk;
+                             }};
+  }
+
+  class Connection : public transport::UploadConnection {
+   public:
+    explicit Connection(FakeServer& server) : s_(server) {}
+    platform::Status AddHeader(const std::string& line) override { return s_.headers.push_back(line), platform::kOk; }
+    platform::Status Start(std::uint32_t contentLength) override {
+      s_.started = true;
+      s_.announced = contentLength;
+      s_.onStart();
+      return platform::kOk;
+    }
+    platform::Status Write(std::string_view piece) override {
+      s_.writes.emplace_back(piece);
+      s_.now += s_.writeMs(piece.size());
+      return platform::kOk;
+    }
+    platform::Status End() override { return s_.ended = true, platform::kOk; }
+    bool QueryStatusCode(std::uint32_t* code) override { return *code = 200, true; }
+    std::string ReadReply() override { return "<uploadTemplate/>"; }
+
+   private:
+    FakeServer& s_;
+  };
+};
 
 // Replaces each "{B}" with the boundary.
 std::string WithBoundary(std::string pattern, const std::string& boundary) {
@@ -35,10 +103,10 @@ std::string FilePart(const std::string& name, const std::string& file, const std
 
 class Upload : public TempFolderTest {
  protected:
-  win::Status Run() {
-    UploadEnvironment environment = server.Environment();
+  platform::Status Run() {
+    transport::UploadEnvironment environment = server.Environment();
     environment.pauseAfterChunkMs = pauseMs;
-    return Uploader(&listener, &request, &result, std::move(environment)).Upload();
+    return transport::Uploader(&listener, &request, &result, std::move(environment)).Upload();
   }
 
   std::vector<std::size_t> ChunkSizes() const {
@@ -60,17 +128,17 @@ class Upload : public TempFolderTest {
     request.AddFile(L"f", MakeSparseFile(L"f", size).c_str());
   }
 
-  UploadRequest request;
-  UploadResult result;
-  RecordingListener<UploadProgress> listener;
+  transport::UploadRequest request;
+  transport::UploadResult result;
+  RecordingListener<transport::UploadProgress> listener;
   FakeServer server;
-  std::uint32_t pauseMs = ChunkPause::kDefaultMs;
+  std::uint32_t pauseMs = transport::ChunkPause::kDefaultMs;
 };
 
 TEST_F(Upload, TheWorkedExampleIsByteExactAndItsLengthAnnounced) {
   request.AddField("title", "Sunset");
   request.AddFile(L"PIPfile", MakeFile(L"C:\\p.xml", "0123456789").c_str());
-  Uploader measuring(nullptr, &request, &result, server.Environment());
+  transport::Uploader measuring(nullptr, &request, &result, server.Environment());
   const std::string b = "---------------------------0029482318BE";
   std::uint64_t total = 0;
   std::vector<std::uint64_t> sizes;
@@ -78,7 +146,7 @@ TEST_F(Upload, TheWorkedExampleIsByteExactAndItsLengthAnnounced) {
   EXPECT_EQ(measuring.ComputeContentLength(b, &total, &sizes), 310u);
   EXPECT_NE(measuring.MakeBoundary(), measuring.MakeBoundary());
   EXPECT_TRUE(std::regex_match(measuring.MakeBoundary(), std::regex("-{27}[0-9A-F]{12}")));
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(server.headers, Lines{"Content-Type: multipart/form-data; boundary=" + server.Boundary()});
   EXPECT_EQ(server.announced, 310u);
   EXPECT_EQ(server.Body(), WithBoundary(FieldPart("title", "Sunset") + FilePart("PIPfile", "C:\\p.xml",
@@ -91,12 +159,12 @@ TEST_F(Upload, TheWorkedExampleIsByteExactAndItsLengthAnnounced) {
 // quote or line break escaped.
 TEST_F(Upload, BodiesOfEveryShapeAreWhatTheirLengthAnnounced) {
   struct Case {
-    std::function<void(UploadRequest&)> fill;
+    std::function<void(transport::UploadRequest&)> fill;
     std::string body;
   };
   const Case cases[] = {
-      {[](UploadRequest&) {}, "--{B}--\r\n"},
-      {[](UploadRequest& r) {
+      {[](transport::UploadRequest&) {}, "--{B}--\r\n"},
+      {[](transport::UploadRequest& r) {
          r.AddFile(L"f", MakeFile(L"p", "1").c_str());
          for (const char* name : {"title", "\xC3\xA9t\xC3\xA9", "AP", "Version", "title"}) r.AddField(name, "v");
          r.AddField("tags", nullptr);
@@ -104,7 +172,7 @@ TEST_F(Upload, BodiesOfEveryShapeAreWhatTheirLengthAnnounced) {
        },
        FieldPart("AP", "last") + FieldPart("Version", "v") + FieldPart("tags", "") + FieldPart("title", "v") +
            FieldPart("\xC3\xA9t\xC3\xA9", "v") + FilePart("f", "p", "1") + "--{B}--\r\n"},
-      {[](UploadRequest& r) {
+      {[](transport::UploadRequest& r) {
          const std::wstring path = MakeFile(L"a\"\u4E2D\r\n", "12");
          r.AddFile(L"a", path.c_str());
          r.AddFile(L"e", MakeFile(L"e", "").c_str());
@@ -114,10 +182,10 @@ TEST_F(Upload, BodiesOfEveryShapeAreWhatTheirLengthAnnounced) {
            FilePart("a", "a%22\xE4\xB8\xAD%0D%0A", "12") + "--{B}--\r\n"},
   };
   for (const Case& c : cases) {
-    request = UploadRequest();
+    request = transport::UploadRequest();
     server = FakeServer();
     c.fill(request);
-    ASSERT_EQ(Run(), win::kOk);
+    ASSERT_EQ(Run(), platform::kOk);
     EXPECT_EQ(server.Body(), WithBoundary(c.body, server.Boundary()));
     EXPECT_EQ(server.Body().size(), server.announced);
   }
@@ -130,7 +198,7 @@ TEST(UploadUrl, AcceptsOnlyPlainHttpOnPort80WithoutExtras) {
       {"http://h/a/../b%20c", "h /a/../b%20c"}, {"http://" + k259 + "/p", k259 + " /p"},
       {"http://h/" + k259.substr(1), "h /" + k259.substr(1)}};
   for (const auto& [url, hostAndPath] : accepted) {
-    UploadRequest request;
+    transport::UploadRequest request;
     EXPECT_TRUE(request.SetUrl(url.c_str())) << url;
     EXPECT_EQ(request.host + " " + request.path, hostAndPath);
   }
@@ -138,12 +206,12 @@ TEST(UploadUrl, AcceptsOnlyPlainHttpOnPort80WithoutExtras) {
            "http://" + k259 + "a/p", "http://h/" + k259, "https://h/p", "HTTP://h/p", "ftp://h/p", "http://h:8080/p",
            "http://user:pw@h/p", "http://h/p?id=1", "http://h/p#top", "http:///p", "http:h/p", "//h/p", "",
            "http://h/a b", "http://h/a\r\nX: y"}) {
-    UploadRequest request;
+    transport::UploadRequest request;
     request.SetUrl("http://before/was");
     EXPECT_FALSE(request.SetUrl(url.c_str())) << url;
     EXPECT_EQ(request.host + request.path, "before/was") << url;
   }
-  EXPECT_FALSE(UploadRequest().SetUrl(nullptr));
+  EXPECT_FALSE(transport::UploadRequest().SetUrl(nullptr));
 }
 
 TEST_F(Upload, FastWritesGrowTheChunkToSixteenMebibytesAndSlowOnesHalveItToTheFloor) {
@@ -151,7 +219,7 @@ TEST_F(Upload, FastWritesGrowTheChunkToSixteenMebibytesAndSlowOnesHalveItToTheFl
   for (std::uint32_t chunk = 32 * KiB; chunk <= 16 * MiB; chunk *= 2) growing.push_back(chunk);
   growing.insert(growing.end(), {16 * MiB, 16 * MiB});
   AddSparseFile(growing);
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(ChunkSizes(), growing);
 
   const std::vector<std::size_t> halving = {32 * KiB, 64 * KiB, 128 * KiB, 64 * KiB, 32 * KiB,
@@ -160,7 +228,7 @@ TEST_F(Upload, FastWritesGrowTheChunkToSixteenMebibytesAndSlowOnesHalveItToTheFl
   request.ClearFiles();
   AddSparseFile(halving);
   ScriptWriteTimes({100, 100, 2000, 1251, 2000, 800, 1250, 500, 499});
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(ChunkSizes(), halving);
 }
 
@@ -172,7 +240,7 @@ TEST_F(Upload, ProgressComesWhenTheHalfSecondChangesAndItsSpeedIsKept) {
   ScriptWriteTimes({300, 300, 300});
   request.AddFile(L"f", MakeSparseFile(L"f", 224 * KiB).c_str());
   request.AddFile(L"g", MakeFile(L"g", "12").c_str());
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(listener.events, (Lines{
       "FileBegin f", "FileProgress f 0 229376 40 0 229378 40 5600", "FileProgress f 98304 229376 1 98304 229378 1 98304",
       "FileProgress f 229376 229376 0 229376 229378 0 114688", "FileProgress f 229376 229376 0 229376 229378 0 114688",
@@ -181,7 +249,7 @@ TEST_F(Upload, ProgressComesWhenTheHalfSecondChangesAndItsSpeedIsKept) {
   request.ClearFiles();
   request.AddFile(L"g", L"g");
   listener.events.clear();
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(listener.Only("FileProgress g").at(0), "FileProgress g 0 2 0 0 2 0 114688");
 }
 
@@ -194,11 +262,11 @@ TEST_F(Upload, ThePauseAfterEachChunkMovesTheReportsButNotTheChunks) {
                    "229376 229376 0 229376 229376 0 32768", "229376 229376 0 229376 229376 0 32768"}}}) {
     for (const int cancelledPoll : {0, 3}) {
       server = FakeServer();
-      listener = RecordingListener<UploadProgress>();
+      listener = RecordingListener<transport::UploadProgress>();
       listener.cancelAt = [=](int poll) { return poll == cancelledPoll; };
       pauseMs = pause;
       ScriptWriteTimes({300, 300, 300});
-      request = UploadRequest();  // the initial speed estimate again
+      request = transport::UploadRequest();  // the initial speed estimate again
       request.AddFile(L"f", MakeSparseFile(L"f", 224 * KiB).c_str());
       Run();
       const std::size_t chunks = cancelledPoll ? 2 : 3;
@@ -219,7 +287,7 @@ TEST_F(Upload, AZeroSpeedGivesNoTimeLeftInsteadOfTrapping) {
   request.rateEstimate = 0;
   ScriptWriteTimes({2000});
   request.AddFile(L"f", MakeFile(L"f", std::string(KiB, 'x')).c_str());
-  ASSERT_EQ(Run(), win::kOk);
+  ASSERT_EQ(Run(), platform::kOk);
   EXPECT_EQ(listener.Only("FileProgress"), (Lines{"FileProgress f 0 1024 0 0 1024 0 0",
                                                   "FileProgress f 1024 1024 0 1024 1024 0 256",
                                                   "FileProgress f 1024 1024 0 1024 1024 0 256"}));
@@ -238,13 +306,13 @@ TEST_F(Upload, ACancelIsPolledAfterEveryChunkAndEndsTheBodyUnfinished) {
                         Case{5, {"FileComplete a 0x00000000", "FileComplete b 0x80040301"}, std::string(32, 'b')}}) {
     SCOPED_TRACE(c.cancelledPoll);
     server = FakeServer();
-    listener = RecordingListener<UploadProgress>();
+    listener = RecordingListener<transport::UploadProgress>();
     listener.cancelAt = [&](int poll) { return poll == c.cancelledPoll; };
     request.ClearFiles();
     request.AddFile(L"a", MakeFile(L"a", "first").c_str());
     request.AddFile(L"b", MakeFile(L"b", std::string(32 * KiB + 100, 'b')).c_str());
-    EXPECT_EQ(Run(), UPLOAD_E_CANCELLED);
-    EXPECT_EQ((std::pair{result.hr, result.httpStatus}), (std::pair{UPLOAD_E_CANCELLED, 0xFFFFFFFFu}));
+    EXPECT_EQ(Run(), transport::UPLOAD_E_CANCELLED);
+    EXPECT_EQ((std::pair{result.hr, result.httpStatus}), (std::pair{transport::UPLOAD_E_CANCELLED, 0xFFFFFFFFu}));
     EXPECT_EQ(listener.Only("FileComplete"), c.completions);
     const std::string body = server.Body();
     EXPECT_EQ(body.substr(body.size() - c.bodyEnd.size()), c.bodyEnd);
@@ -253,7 +321,7 @@ TEST_F(Upload, ACancelIsPolledAfterEveryChunkAndEndsTheBodyUnfinished) {
   listener.cancelAt = [](int) { return true; };
   listener.polls = 0;
   request.ClearFiles();
-  EXPECT_EQ(Run(), win::kOk) << "an upload without files cannot be cancelled";
+  EXPECT_EQ(Run(), platform::kOk) << "an upload without files cannot be cancelled";
   EXPECT_EQ(listener.polls, 0);
 }
 
@@ -307,6 +375,15 @@ TEST_F(Upload, FileFaultsEndTheUploadWithTheirStatus) {
     EXPECT_EQ(listener.Only("FileComplete f0"), c.started ? Lines{"FileComplete f0 0x00000000"} : Lines{});
     EXPECT_EQ(listener.Only("FileBegin f1").size(), c.status == 0x800703EEu ? 1u : 0u);
     EXPECT_EQ(OpenDescriptors(), descriptors);
+  }
+}
+
+TEST(ChunkPauseSetting, OnlyDecimalMillisecondsUpToOneSecondAreTaken) {
+  for (const auto& [text, ms] : std::vector<std::pair<const char*, std::optional<std::uint32_t>>>{
+           {"0", 0}, {"50", 50}, {"1000", 1000}, {"0007", 7}, {"", {}}, {"1001", {}}, {"-1", {}},
+           {"+5", {}}, {" 5", {}}, {"5 ", {}}, {"5ms", {}}, {"0x10", {}}, {"1e3", {}}, {"2.5", {}},
+           {"4294967346", {}}, {"99999999999999999999", {}}}) {
+    EXPECT_EQ(transport::ChunkPause::Parse(text), ms) << '"' << text << '"';
   }
 }
 

@@ -11,9 +11,9 @@
 #include <future>
 #include <numeric>
 
+#include "fixtures.h"
 #include "platform/message_queue.h"
 #include "platform/window.h"
-#include "support/fixtures.h"
 #include "upload/CUploadProgressProxyWindow.h"
 #include "upload/PendingCallPump.h"
 #include "upload/PyPresetUploader.h"
@@ -25,7 +25,7 @@ using namespace test_support;
 using Lines = std::vector<std::string>;
 constexpr std::uint32_t kMessage = 0x802A;
 
-class ProbeThread : public Thread {
+class ProbeThread : public upload::Thread {
  public:
   std::atomic<bool> sawItself{false};
 
@@ -54,11 +54,11 @@ TEST(WorkerThread, RunBeginsOnlyAfterHandleAndIdAreStoredAndJoinGivesItsResultOn
   busy = false;
   for (std::thread& spinner : spinners) spinner.join();
   EXPECT_EQ(ProbeThread().Join(), 0u) << "a thread never started joins at once";
-  struct Throwing : Thread {
+  struct Throwing : upload::Thread {
     std::uint32_t Run() override { throw std::bad_alloc(); }  // would end the process
   } throwing;
   ASSERT_TRUE(throwing.Start());
-  EXPECT_EQ(throwing.Join(), Thread::kRunFailed);
+  EXPECT_EQ(throwing.Join(), upload::Thread::kRunFailed);
 }
 
 // What a test window saw, reached through its user data.
@@ -66,13 +66,13 @@ struct Journal {
   std::vector<std::intptr_t> payloads;
   bool onOwner = true;
   std::thread::id owner = std::this_thread::get_id();
-  std::unique_ptr<ui::Window>* destroyOnFirst = nullptr;  // by its own handler
+  std::unique_ptr<platform::Window>* destroyOnFirst = nullptr;  // by its own handler
   std::function<void()> duringDispatch = [] {};            // run inside each handler
 };
 
 std::atomic<int> g_dropped{0};
 
-std::intptr_t Record(ui::Window& window, std::uint32_t, std::uintptr_t, std::intptr_t lparam) {
+std::intptr_t Record(platform::Window& window, std::uint32_t, std::uintptr_t, std::intptr_t lparam) {
   auto* journal = static_cast<Journal*>(window.UserData());
   journal->onOwner = journal->onOwner && std::this_thread::get_id() == journal->owner;
   journal->payloads.push_back(*reinterpret_cast<int*>(lparam));
@@ -82,7 +82,7 @@ std::intptr_t Record(ui::Window& window, std::uint32_t, std::uintptr_t, std::int
   return 0;
 }
 
-void PostNumber(ui::Window& window, int number) {
+void PostNumber(platform::Window& window, int number) {
   window.Post(kMessage, 0, reinterpret_cast<std::intptr_t>(new int(number)), [](std::intptr_t lparam) {
     delete reinterpret_cast<int*>(lparam);
     ++g_dropped;
@@ -93,11 +93,11 @@ class Windows : public ::testing::Test {
  protected:
   static void SetUpTestSuite() {
     StartPython();
-    ui::RegisterWindowClass(L"Test Window", &Record);
+    platform::RegisterWindowClass(L"Test Window", &Record);
   }
   void SetUp() override { g_dropped = 0; }
-  std::unique_ptr<ui::Window> MakeWindow(Journal& journal) {
-    auto window = ui::Window::Create(L"Test Window");
+  std::unique_ptr<platform::Window> MakeWindow(Journal& journal) {
+    auto window = platform::Window::Create(L"Test Window");
     window->SetUserData(&journal);
     return window;
   }
@@ -115,12 +115,12 @@ TEST_F(Windows, DestroyingAWindowDropsItsMessagesAndAHandlerMayDestroyItsOwn) {
   }
   goneWindow.reset();
   EXPECT_EQ(g_dropped, 3);
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 4u);
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), 4u);
   EXPECT_EQ((std::vector{kept.payloads, gone.payloads, self.payloads}),
             (std::vector<std::vector<std::intptr_t>>{{0, 1, 2}, {}, {10}}));
-  EXPECT_EQ((std::pair{selfWindow.get(), g_dropped.load()}), (std::pair{(ui::Window*)nullptr, 5}));
+  EXPECT_EQ((std::pair{selfWindow.get(), g_dropped.load()}), (std::pair{(platform::Window*)nullptr, 5}));
   std::thread([] {
-    auto window = ui::Window::Create(L"Test Window");
+    auto window = platform::Window::Create(L"Test Window");
     for (int i = 0; i < 4; ++i) PostNumber(*window, i);
   }).join();
   EXPECT_EQ(g_dropped, 9) << "a thread that never dispatches frees its messages with its windows";
@@ -134,7 +134,7 @@ TEST_F(Windows, AThrowingHandlerLosesOnlyItsMessageAndADestroyWaitsForTheDispatc
   auto window = MakeWindow(journal);
   journal.duringDispatch = [&] { if (journal.payloads.size() == 1) throw std::bad_alloc(); };
   for (int i = 0; i < 3; ++i) PostNumber(*window, i);
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 3u);
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), 3u);
   EXPECT_EQ(journal.payloads, (std::vector<std::intptr_t>{0, 1, 2}));
   std::promise<void> entered;
   std::atomic<bool> returned{false};
@@ -151,7 +151,7 @@ TEST_F(Windows, AThrowingHandlerLosesOnlyItsMessageAndADestroyWaitsForTheDispatc
     window.reset();
     EXPECT_TRUE(returned);
   });
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), 1u);
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), 1u);
   destroyer.join();
   EXPECT_EQ(g_dropped, 1);
 }
@@ -159,7 +159,7 @@ TEST_F(Windows, AThrowingHandlerLosesOnlyItsMessageAndADestroyWaitsForTheDispatc
 // Posted from a worker, thousands arrive in order while the main thread only
 // runs Python code; a post that the full pending-call queue refuses is retried.
 TEST_F(Windows, ThePumpDeliversEveryPostInOrderWhenPythonRunsEvenAfterARefusal) {
-  InstallPendingCallPump();
+  upload::InstallPendingCallPump();
   static std::atomic<int> othersRun{0};
   int others = 0;
   while (Py_AddPendingCall([](void*) { return ++othersRun, 0; }, nullptr) == 0) ++others;
@@ -174,7 +174,7 @@ TEST_F(Windows, ThePumpDeliversEveryPostInOrderWhenPythonRunsEvenAfterARefusal) 
   EXPECT_EQ(posted, 0) << "the first post keeps retrying while the queue is full";
   const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(60);
   while (journal.payloads.size() < kPosts && std::chrono::steady_clock::now() < deadline) {
-    RunPython("for i in range(200): pass");
+    ASSERT_EQ(PyRun_SimpleString("for i in range(200): pass"), 0);
   }
   worker.join();
   std::vector<std::intptr_t> inOrder(kPosts);
@@ -184,9 +184,9 @@ TEST_F(Windows, ThePumpDeliversEveryPostInOrderWhenPythonRunsEvenAfterARefusal) 
   EXPECT_EQ(othersRun, others);
 }
 
-class Target : public RecordingListener<BackgroundUploadProgress> {
+class Target : public RecordingListener<transport::BackgroundUploadProgress> {
  public:
-  std::unique_ptr<CUploadProgressProxyWindow>* destroyOnCompletion = nullptr;
+  std::unique_ptr<upload::CUploadProgressProxyWindow>* destroyOnCompletion = nullptr;
   void OnReservedEvent() override { Add("Reserved"); }
   void OnBackgroundUploadComplete(std::int32_t result) override {
     Add("Complete", nullptr, {static_cast<std::uint32_t>(result)});
@@ -195,7 +195,7 @@ class Target : public RecordingListener<BackgroundUploadProgress> {
 };
 
 // Every event once, from a worker, with its text in a buffer overwritten right after.
-void RaiseEveryEvent(CUploadProgressProxyWindow& proxy) {
+void RaiseEveryEvent(upload::CUploadProgressProxyWindow& proxy) {
   std::thread([&] {
     std::wstring buffer;
     auto with = [&](const wchar_t* text) { return (buffer = text).c_str(); };
@@ -226,39 +226,39 @@ const Lines kEveryEvent = {
 
 TEST_F(Windows, TheProxyCopiesEveryEventToTheWindowsThreadAndAnswersTheCancelPollAtOnce) {
   Target target;
-  auto proxy = std::make_unique<CUploadProgressProxyWindow>(&target);
+  auto proxy = std::make_unique<upload::CUploadProgressProxyWindow>(&target);
   ASSERT_TRUE(proxy->CreateHiddenWindow());
   RaiseEveryEvent(*proxy);
   EXPECT_TRUE(target.events.empty()) << "nothing runs before the owner dispatches";
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), kEveryEvent.size());
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), kEveryEvent.size());
   EXPECT_EQ(target.events, kEveryEvent);
   EXPECT_EQ(target.threads, std::vector(kEveryEvent.size(), std::this_thread::get_id()));
 
   target.events.clear();
-  proxy->SetEventFilter(CUploadProgressProxyWindow::kForwardRequestSent);  // all but SendingRequest
+  proxy->SetEventFilter(upload::CUploadProgressProxyWindow::kForwardRequestSent);  // all but SendingRequest
   target.cancelAt = [](int poll) { return poll == 2; };
   std::vector<bool> answers;
   std::thread([&] { answers = {proxy->IsCancelled(), proxy->IsCancelled()}; }).join();
   EXPECT_EQ(answers, (std::vector<bool>{false, true}));
   target.destroyOnCompletion = &proxy;
   RaiseEveryEvent(*proxy);
-  EXPECT_EQ(ui::MessageQueue::DispatchPending(), kEveryEvent.size() - 1);
+  EXPECT_EQ(platform::MessageQueue::DispatchPending(), kEveryEvent.size() - 1);
   EXPECT_EQ(proxy, nullptr) << "the completion handler may destroy the proxy it runs in";
   Lines filtered = kEveryEvent;
   filtered.erase(filtered.begin() + 4);
   EXPECT_EQ(target.events, filtered);
   Target untouched;
-  CUploadProgressProxyWindow destroyed(&untouched);
+  upload::CUploadProgressProxyWindow destroyed(&untouched);
   ASSERT_TRUE(destroyed.CreateHiddenWindow());
   RaiseEveryEvent(destroyed);
   destroyed.DestroyWindow();  // leak checkers see the dropped commands freed
   RaiseEveryEvent(destroyed);  // without a window the events go nowhere
-  EXPECT_EQ((std::pair{ui::MessageQueue::DispatchPending(), untouched.events.size()}), (std::pair{0ul, 0ul}));
+  EXPECT_EQ((std::pair{platform::MessageQueue::DispatchPending(), untouched.events.size()}), (std::pair{0ul, 0ul}));
 }
 
 TEST_F(Windows, ProgressCarriesTheWholePercentOfAllFilesAndTheFilesTimeLeft) {
-  RunPython("reports = []\ndef record(*args): reports.append(args)");
-  PyPresetUploader uploader(L"api.orbishare.com", L"token", L"5.0", L"Retail", L"uuid");
+  ASSERT_EQ(PyRun_SimpleString("reports = []\ndef record(*args): reports.append(args)"), 0);
+  upload::PyPresetUploader uploader(L"api.orbishare.com", L"token", L"5.0", L"Retail", L"uuid");
   uploader.SetCallback(PyDict_GetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), "record"));
   // sent, size, file's time left; nothing to send is all sent, never a division by zero
   for (const auto& [sent, size, left] : std::vector<std::array<std::uint32_t, 3>>{

@@ -4,6 +4,9 @@
 #include <Python.h>
 #include <gtest/gtest.h>
 
+#include <stdexcept>
+
+#include "fixtures.h"
 #include "module/runtime/ModuleTypes.h"
 #include "module/runtime/PySwigObject.h"
 #include "module/runtime/PySwigPacked.h"
@@ -11,12 +14,10 @@
 #include "module/runtime/TypeTable.h"
 #include "module/runtime/call.h"
 #include "module/runtime/pointers.h"
-#include <stdexcept>
-#include "support/fixtures.h"
 
 namespace {
 
-using namespace binding;
+using namespace runtime;
 
 // The ring's head for these tests: the types the conversions look up, and one more.
 TypeInfo* Type(const char* mangled) {
