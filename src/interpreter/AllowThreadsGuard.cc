@@ -3,6 +3,7 @@
 #include "interpreter/AllowThreadsGuard.h"
 
 #include "interpreter/InterpreterLockHeld.h"
+#include "interpreter/ParkIfStopped.h"
 
 namespace interpreter {
 
@@ -11,7 +12,8 @@ void* AllowThreadsGuard::ReleaseInterpreterLock() {
 }
 
 void AllowThreadsGuard::RetakeInterpreterLock(void* released) {
-  if (released != nullptr) PyEval_RestoreThread(static_cast<PyThreadState*>(released));
+  if (released == nullptr) return;
+  ParkIfStopped([released] { PyEval_RestoreThread(static_cast<PyThreadState*>(released)); });
 }
 
 }  // namespace interpreter

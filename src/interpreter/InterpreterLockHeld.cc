@@ -1,12 +1,9 @@
-#include <Python.h>
-
 #include "interpreter/InterpreterLockHeld.h"
+
+#include "interpreter/PythonApi.h"
 
 namespace interpreter {
 
-bool InterpreterLockHeld() {
-  PyThreadState* mine = PyGILState_GetThisThreadState();
-  return mine != nullptr && mine == _PyThreadState_Current;
-}
+bool InterpreterLockHeld() { return python_api::ThisThreadHoldsLock(); }
 
 }  // namespace interpreter

@@ -24,7 +24,7 @@ extern const ModuleFunction kInfoEffectURLFunctions[];
 extern const ModuleFunction kOBLoginDataFunctions[];
 extern const ModuleFunction kPyPresetUploaderFunctions[];
 
-// The null-terminated table handed to Py_InitModule4; static storage.
+// The null-terminated table the module is created with; static storage.
 PyMethodDef* FunctionTable();
 
 }  // namespace module

@@ -15,6 +15,7 @@
 #include <thread>
 #include <vector>
 
+#include "interpreter/PythonApi.h"
 #include "platform/text.h"
 
 namespace test_support {
@@ -22,15 +23,12 @@ namespace test_support {
 // The test thread is the interpreter's main thread and holds its lock. The
 // interpreter stays up until the process ends, still reachable for leak checkers.
 inline void StartPython() {
-  if (Py_IsInitialized()) return;
-  Py_NoSiteFlag = 1;
-  Py_InitializeEx(0);
-  PyEval_InitThreads();
+  if (!Py_IsInitialized()) python_api::StartHostedInterpreter();
 }
 
 // The interpreter keeps objects in memory the leak checker cannot follow.
 extern "C" __attribute__((weak, used, visibility("default"))) const char* __lsan_default_suppressions() {
-  return "leak:libpython2.7.so\n";
+  return "leak:libpython\n";
 }
 
 // Sets (or, without a value, unsets) an environment variable for its lifetime.
