@@ -1,7 +1,9 @@
 """What the benchmarks share: the preset they publish, files to publish, the
 process's resident memory, the engine's chunk log, waiting for the completion
-report and printing tables. Python 2.7, like the module; it never imports the
-module itself, so a driver may use it without loading the module."""
+report and printing tables. Python 2.7 and 3, like the module; it never imports
+the module itself, so a driver may use it without loading the module."""
+from __future__ import print_function
+
 import os
 import time
 
@@ -105,5 +107,5 @@ def print_table(header, rows):
     cells = [list(header)] + [[str(cell) for cell in row] for row in rows]
     widths = [max(len(row[i]) for row in cells) for i in range(len(header))]
     for row in cells:
-        print '  '.join(cell.ljust(width) if i == 0 else cell.rjust(width)
-                        for i, (cell, width) in enumerate(zip(row, widths)))
+        print('  '.join(cell.ljust(width) if i == 0 else cell.rjust(width)
+                        for i, (cell, width) in enumerate(zip(row, widths))))

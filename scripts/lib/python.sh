@@ -2,15 +2,24 @@
 # build folder was configured for. The build picks its default the same way:
 # PYTHON2, else pyenv's 2.7.18, else the system's python3.
 
+# pyenv's root, also where pyenv itself is not on PATH.
+pyenv_root() {
+  pyenv root 2>/dev/null || echo "${PYENV_ROOT:-$HOME/.pyenv}"
+}
+
 # Where the 2.7 interpreter is looked for: PYTHON2 when set, else pyenv's 2.7.18.
 python2_path() {
   if [[ -n ${PYTHON2:-} ]]; then
     echo "$PYTHON2"
-    return
+  else
+    echo "$(pyenv_root)/versions/2.7.18/bin/python2.7"
   fi
-  local root
-  root=$(pyenv root 2>/dev/null) || root=${PYENV_ROOT:-$HOME/.pyenv}
-  echo "$root/versions/2.7.18/bin/python2.7"
+}
+
+# pyenv's newest interpreter of a release line (say 3.13); nothing when it has none.
+newest_pyenv_python() {
+  local line=$1
+  { compgen -G "$(pyenv_root)/versions/$line*/bin/python$line" || true; } | sort -V | tail -n 1
 }
 
 have_python2() {
