@@ -1,9 +1,8 @@
 // The hand-over of progress reports from the upload worker to the UI thread (the
 // interpreter's main thread), measured with the system's own classes: the proxy
 // window posts, the message queue dispatches through the interpreter's pending
-// calls, and the preset uploader calls a Python callable. Built for the
-// build folder's interpreter (2.7 or 3); prints its figures as JSON, which
-// bench/handover lays side by side for each interpreter.
+// calls, and the preset uploader calls a Python callable. Prints its figures
+// as JSON, which bench/handover lays side by side for each interpreter.
 //
 //   build/bench/bench_handover
 //
@@ -96,37 +95,14 @@ PyMethodDef kHandoverMethods[] = {
     {nullptr, nullptr, 0, nullptr},
 };
 
-#if PY_MAJOR_VERSION >= 3
-PyModuleDef kHandoverModule = {PyModuleDef_HEAD_INIT, "handover", nullptr, -1, kHandoverMethods,
-                               nullptr, nullptr, nullptr, nullptr};
-
-PyObject* InitHandover() { return PyModule_Create(&kHandoverModule); }
-
-// Without site and signal handlers, like Py_InitializeEx(0) with Py_NoSiteFlag on 2.7.
-void StartInterpreter() {
-  PyImport_AppendInittab("handover", &InitHandover);
-  PyConfig config;
-  PyConfig_InitPythonConfig(&config);
-  config.site_import = 0;
-  config.install_signal_handlers = 0;
-  const PyStatus status = Py_InitializeFromConfig(&config);
-  PyConfig_Clear(&config);
-  if (PyStatus_Exception(status)) Py_ExitStatusException(status);
-}
-#else
-void StartInterpreter() {
-  Py_NoSiteFlag = 1;
-  Py_InitializeEx(0);
-  PyEval_InitThreads();
-  Py_InitModule("handover", kHandoverMethods);
-}
-#endif
-
 // The interpreter, with this thread as its main thread holding the lock.
 class Interpreter {
  public:
   Interpreter() {
-    StartInterpreter();
+    Py_NoSiteFlag = 1;
+    Py_InitializeEx(0);
+    PyEval_InitThreads();
+    Py_InitModule("handover", kHandoverMethods);
     PyRun_SimpleString(kPythonSetUp);
   }
   ~Interpreter() { Py_Finalize(); }
@@ -137,9 +113,8 @@ class Interpreter {
   static PyObject* Global(const char* name) {
     return PyDict_GetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), name);
   }
-  // PyLong_AsLong takes 2.7's int as well.
-  static long Delivered() { return PyLong_AsLong(PyList_GetItem(Global("reports"), 0)); }
-  static void ResetDelivered() { PyRun_SimpleString("reports[0] = 0"); }
+  static long Delivered() { return PyInt_AsLong(PyList_GetItem(Global("reports"), 0)); }
+  static void ResetDelivered() { PyList_SetItem(Global("reports"), 0, PyInt_FromLong(0)); }
 };
 
 // One progress report of a file that streams, as the engine raises it.
