@@ -24,6 +24,7 @@
 #include <thread>
 #include <vector>
 
+#include "interpreter/PythonApi.h"
 #include "upload/CUploadProgressProxyWindow.h"
 #include "upload/PyPresetUploader.h"
 
@@ -99,10 +100,9 @@ PyMethodDef kHandoverMethods[] = {
 class Interpreter {
  public:
   Interpreter() {
-    Py_NoSiteFlag = 1;
-    Py_InitializeEx(0);
-    PyEval_InitThreads();
-    Py_InitModule("handover", kHandoverMethods);
+    python_api::StartHostedInterpreter();
+    PyObject* handover = python_api::CreateModule("handover", kHandoverMethods, PYTHON_API_VERSION);
+    PyDict_SetItemString(PyImport_GetModuleDict(), "handover", handover);
     PyRun_SimpleString(kPythonSetUp);
   }
   ~Interpreter() { Py_Finalize(); }
@@ -113,8 +113,8 @@ class Interpreter {
   static PyObject* Global(const char* name) {
     return PyDict_GetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), name);
   }
-  static long Delivered() { return PyInt_AsLong(PyList_GetItem(Global("reports"), 0)); }
-  static void ResetDelivered() { PyList_SetItem(Global("reports"), 0, PyInt_FromLong(0)); }
+  static long Delivered() { return PyLong_AsLong(PyList_GetItem(Global("reports"), 0)); }
+  static void ResetDelivered() { PyList_SetItem(Global("reports"), 0, python_api::NewInt(0)); }
 };
 
 // One progress report of a file that streams, as the engine raises it.

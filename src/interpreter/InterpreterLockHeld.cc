@@ -1,8 +1,5 @@
-#include <Python.h>
-
 #include "interpreter/InterpreterLockHeld.h"
 
-bool InterpreterLockHeld() {
-  PyThreadState* mine = PyGILState_GetThisThreadState();
-  return mine != nullptr && mine == _PyThreadState_Current;
-}
+#include "interpreter/PythonApi.h"
+
+bool InterpreterLockHeld() { return python_api::ThisThreadHoldsLock(); }

@@ -5,7 +5,7 @@
 
 namespace module {
 
-// The null-terminated table handed to Py_InitModule4; static storage.
+// The null-terminated table the module is created with; static storage.
 PyMethodDef* FunctionTable();
 
 }  // namespace module

@@ -1,7 +1,9 @@
-// The module's entry point, the only symbol the library exports.
+// The module's entry point, the only symbol the library exports: init_PyUploader on
+// Python 2.7, PyInit__PyUploader on 3.
 #include <Python.h>
 
 #include "interpreter/AllowThreadsGuard.h"
+#include "interpreter/PythonApi.h"
 #include "module/function_table.h"
 #include "module/runtime/TypeTable.h"
 #include "module/runtime/exception_barrier.h"
@@ -14,23 +16,25 @@ namespace {
 constexpr char kModuleName[] = "_PyUploader";
 constexpr int kApiVersion = 1013;
 
-}  // namespace
-
-extern "C" __attribute__((visibility("default"))) void init_PyUploader() {
+PyObject* MakeModule() {
   // What loading the library sets up: the HTTP library, the interpreter lock for
   // the worker and probe threads, and its release during the lower layers'
   // blocking waits.
   http::GlobalInit();
-  PyEval_InitThreads();
+  python_api::PrepareThreads();
   InstallBlockingRelease(
       {&AllowThreadsGuard::ReleaseInterpreterLock, &AllowThreadsGuard::RetakeInterpreterLock});
 
-  PyObject* module =
-      Py_InitModule4(kModuleName, module::FunctionTable(), nullptr, nullptr, kApiVersion);
-  if (!module) return;  // the module defines no constants
+  PyObject* module = python_api::CreateModule(kModuleName, module::FunctionTable(), kApiVersion);
+  if (!module) return nullptr;  // the module defines no constants
   // A failure raised here makes the import fail.
-  binding::RaiseOnException(0, [] {
+  const int failed = binding::RaiseOnException(1, [] {
     binding::InitializeTypeTable(module::ModuleTypeTable());
     return 0;
   });
+  return failed ? python_api::AbandonModule(module) : module;
 }
+
+}  // namespace
+
+PYUPLOADER_MODULE_INIT(_PyUploader, MakeModule)

@@ -5,6 +5,7 @@
 #include <chrono>
 #include <thread>
 
+#include "interpreter/PythonApi.h"
 #include "platform/message_queue.h"
 
 namespace {
@@ -19,8 +20,10 @@ int DrainMainThreadQueue(void*) {
   return 0;
 }
 
+// An interpreter that has gone away runs nothing more: the queue stays undrained.
 void ScheduleDrain() {
-  while (Py_AddPendingCall(&DrainMainThreadQueue, nullptr) != 0) {
+  while (python_api::TakesPendingCalls() &&
+         Py_AddPendingCall(&DrainMainThreadQueue, nullptr) != 0) {
     std::this_thread::sleep_for(kRefusedRetryDelay);
   }
 }

@@ -5,6 +5,7 @@
 
 #include <string>
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/ModuleTypes.h"
 #include "module/runtime/call.h"
 
@@ -48,9 +49,12 @@ PyMethodDef g_functions[] = {
     {nullptr, nullptr, 0, nullptr},
 };
 
+PyObject* MakeModule() {
+  PyObject* module = python_api::CreateModule("_PyUploaderTestPeer", g_functions, kApiVersion);
+  if (module) InitializeTypeTable(Types().table());
+  return module;
+}
+
 }  // namespace
 
-extern "C" __attribute__((visibility("default"))) void init_PyUploaderTestPeer() {
-  if (!Py_InitModule4("_PyUploaderTestPeer", g_functions, nullptr, nullptr, kApiVersion)) return;
-  InitializeTypeTable(Types().table());
-}
+PYUPLOADER_MODULE_INIT(_PyUploaderTestPeer, MakeModule)

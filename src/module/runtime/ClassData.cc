@@ -4,6 +4,7 @@
 #include <utility>
 #include <vector>
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/PyRef.h"
 #include "module/runtime/pointers.h"
 
@@ -23,7 +24,7 @@ bool TakesSingleObject(PyObject* function) {
 }
 
 void SetConstructor(ClassData& data, PyObject* cls) {
-  data.newRaw = PyClass_Check(cls) ? nullptr : OptionalAttribute(cls, "__new__");
+  data.newRaw = python_api::IsClassicClass(cls) ? nullptr : OptionalAttribute(cls, "__new__");
   if (data.newRaw) {
     data.newArgs = PyTuple_Pack(1, cls);
   } else {
@@ -74,7 +75,7 @@ bool StoreThis(PyObject* instance, PyObject* pointerObject) {
 PyObject* NewClassicInstance(const ClassData& data, PyObject* pointerObject) {
   PyRef dict(PyDict_New());
   if (!dict || PyDict_SetItem(dict.get(), ThisName(), pointerObject) != 0) return nullptr;
-  return PyInstance_NewRaw(data.newArgs, dict.get());
+  return python_api::NewClassicInstance(data.newArgs, dict.get());
 }
 
 }  // namespace

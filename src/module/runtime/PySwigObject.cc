@@ -4,6 +4,7 @@
 #include <cstdio>
 #include <string>
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/ClassData.h"
 #include "module/runtime/PyRef.h"
 #include "module/runtime/StaticType.h"
@@ -69,16 +70,20 @@ PyObject* ReprSlot(PyObject* self) {
     if (object.next) {
       PyRef nextText(PyObject_Repr(object.next));  // its recursion limit guards long chains
       if (!nextText) return nullptr;
-      text += PyString_AsString(nextText.get());
+      const char* nextChars = python_api::NarrowTextChars(nextText.get());
+      if (!nextChars) return nullptr;
+      text += nextChars;
     }
-    return PyString_FromStringAndSize(text.data(), text.size());
+    return python_api::NewNarrowText(text.data(), text.size());
   });
 }
 
 int PrintSlot(PyObject* self, FILE* file, int) {
   PyRef text(ReprSlot(self));
   if (!text) return -1;
-  std::fputs(PyString_AS_STRING(text.get()), file);
+  const char* chars = python_api::NarrowTextChars(text.get());
+  if (!chars) return -1;
+  std::fputs(chars, file);
   return 0;
 }
 
@@ -86,7 +91,7 @@ PyObject* StrSlot(PyObject* self) {
   return RaiseOnException<PyObject*>(nullptr, [self] {
     PySwigObject& object = *AsObject(self);
     std::string text = "_" + PackBytes(&object.ptr, sizeof object.ptr) + object.type->mangledName;
-    return PyString_FromStringAndSize(text.data(), text.size());
+    return python_api::NewNarrowText(text.data(), text.size());
   });
 }
 
@@ -100,7 +105,7 @@ PyObject* LongSlot(PyObject* self) { return PyLong_FromVoidPtr(AsObject(self)->p
 
 PyObject* FormattedAddress(PyObject* self, const char* format) {
   return RaiseOnException<PyObject*>(nullptr, [self, format] {
-    return PyString_FromString(FormatAddress(format, AsObject(self)->ptr).c_str());
+    return python_api::NewNarrowText(FormatAddress(format, AsObject(self)->ptr).c_str());
   });
 }
 PyObject* OctSlot(PyObject* self) { return FormattedAddress(self, "%" PRIoPTR); }
@@ -175,10 +180,7 @@ PyMethodDef kMethods[] = {
 
 PyNumberMethods MakeNumberMethods() {
   PyNumberMethods number{};
-  number.nb_int = LongSlot;
-  number.nb_long = LongSlot;
-  number.nb_oct = OctSlot;
-  number.nb_hex = HexSlot;
+  python_api::SetIntegerSlots(number, LongSlot, OctSlot, HexSlot);
   return number;
 }
 
@@ -186,8 +188,8 @@ PyTypeObject MakeType() {
   static PyNumberMethods number = MakeNumberMethods();
   PyTypeObject type = StaticType::Template(kTypeName, sizeof(PySwigObject));
   type.tp_dealloc = Dealloc;
-  type.tp_print = PrintSlot;
-  type.tp_compare = CompareSlot;
+  python_api::SetPrintSlot(type, PrintSlot);
+  python_api::SetCompareSlot<CompareSlot>(type);
   type.tp_repr = ReprSlot;
   type.tp_as_number = &number;
   type.tp_str = StrSlot;

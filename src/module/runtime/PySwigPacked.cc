@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/StaticType.h"
 #include "module/runtime/exception_barrier.h"
 #include "module/runtime/text_form.h"
@@ -35,7 +36,7 @@ std::string Repr(const PySwigPacked& packed) {
 PyObject* ReprSlot(PyObject* self) {
   return RaiseOnException<PyObject*>(nullptr, [self] {
     std::string text = Repr(*AsPacked(self));
-    return PyString_FromStringAndSize(text.data(), text.size());
+    return python_api::NewNarrowText(text.data(), text.size());
   });
 }
 
@@ -43,7 +44,7 @@ PyObject* StrSlot(PyObject* self) {
   return RaiseOnException<PyObject*>(nullptr, [self] {
     const PySwigPacked& packed = *AsPacked(self);
     std::string text = PackedForm(packed).value_or("") + packed.type->mangledName;
-    return PyString_FromStringAndSize(text.data(), text.size());
+    return python_api::NewNarrowText(text.data(), text.size());
   });
 }
 
@@ -70,8 +71,8 @@ void Dealloc(PyObject* self) {
 PyTypeObject MakeType() {
   PyTypeObject type = StaticType::Template(kTypeName, sizeof(PySwigPacked));
   type.tp_dealloc = Dealloc;
-  type.tp_print = PrintSlot;
-  type.tp_compare = CompareSlot;
+  python_api::SetPrintSlot(type, PrintSlot);
+  python_api::SetCompareSlot<CompareSlot>(type);
   type.tp_repr = ReprSlot;
   type.tp_str = StrSlot;
   return type;

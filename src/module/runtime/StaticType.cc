@@ -12,8 +12,9 @@ constexpr char kDoc[] = "Swig object carries a C/C++ instance pointer";
 
 PyTypeObject StaticType::Template(const char* name, Py_ssize_t basicSize) {
   PyTypeObject type{};
-  Py_REFCNT(&type) = 1;
-  Py_TYPE(&type) = &PyType_Type;
+  PyObject* head = reinterpret_cast<PyObject*>(&type);
+  head->ob_refcnt = 1;
+  head->ob_type = &PyType_Type;
   type.tp_name = name;
   type.tp_basicsize = basicSize;
   type.tp_getattro = PyObject_GenericGetAttr;

@@ -4,6 +4,7 @@
 
 #include <cstring>
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/ClassData.h"
 #include "module/runtime/pointers.h"
 
@@ -11,9 +12,11 @@ namespace binding {
 
 namespace {
 
-// The module that holds the ring: no functions, one attribute holding the head table.
-char kRingModule[] = "swig_runtime_data3";
-char kRingAttribute[] = "type_pointer";
+// The module that holds the ring: no functions, one attribute holding the head table
+// (on 3 a capsule, under the name the generator's runtime gives it there).
+constexpr char kRingModule[] = "swig_runtime_data3";
+constexpr const char* kRingAttribute = PY_MAJOR_VERSION >= 3 ? "type_pointer_capsule" : "type_pointer";
+constexpr char kRingCapsule[] = "swig_runtime_data3.type_pointer_capsule";
 constexpr int kRingApiVersion = 1013;
 
 TypeTable* g_moduleTable = nullptr;  // this module's own table
@@ -31,17 +34,17 @@ void ReleaseRing(void* pointer) {
 
 TypeTable* LookUpRing() {
   if (!g_ringHead) {
-    g_ringHead = static_cast<TypeTable*>(PyCObject_Import(kRingModule, kRingAttribute));
+    g_ringHead = static_cast<TypeTable*>(
+        python_api::ImportPublishedPointer(kRingModule, kRingAttribute, kRingCapsule));
     if (!g_ringHead) PyErr_Clear();
   }
   return g_ringHead;
 }
 
 void CreateRing(TypeTable& head) {
-  static PyMethodDef noFunctions[] = {{nullptr, nullptr, 0, nullptr}};
-  PyObject* module = Py_InitModule4(kRingModule, noFunctions, nullptr, nullptr, kRingApiVersion);
+  PyObject* module = python_api::AddEmptyModule(kRingModule, kRingApiVersion);
   if (!module) return;
-  PyObject* pointer = PyCObject_FromVoidPtr(&head, ReleaseRing);
+  PyObject* pointer = python_api::NewPublishedPointer(&head, kRingCapsule, ReleaseRing);
   if (pointer && PyModule_AddObject(module, kRingAttribute, pointer) == 0) g_ringHead = &head;
 }
 

@@ -10,6 +10,7 @@
 #include <cstddef>
 #include <memory>
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/TypeInfo.h"
 #include "module/runtime/conversions.h"
 #include "module/runtime/pointers.h"
@@ -70,19 +71,18 @@ ReferenceKind<T> Reference(TypeInfo* type, const char* cType) {
   return ReferenceKind<T>{{type, cType, OnNull::kRefuse, 0}};
 }
 
-// A `unicode` (or subclass) only; the operation reads its own buffer during the call.
+// A `unicode` (or subclass) only, on 3 a `str`; on 2.7 the operation reads the
+// object's own buffer during the call, on 3 a copy.
 struct UnicodeKind : NeverSkips {
-  using Slot = const wchar_t*;
+  using Slot = python_api::UnicodeChars;
   bool Convert(const char*, int, PyObject* object, Slot& slot) const {
     if (!PyUnicode_Check(object)) {
       PyErr_SetString(PyExc_TypeError, "Unicode string expected");
       return false;
     }
-    // Same width and values: this interpreter stores characters as UCS-4.
-    slot = reinterpret_cast<const wchar_t*>(PyUnicode_AS_UNICODE(object));
-    return true;
+    return slot.Read(object);
   }
-  const wchar_t* Value(Slot& slot) const { return slot; }
+  const wchar_t* Value(Slot& slot) const { return slot.get(); }
 };
 inline UnicodeKind Unicode() { return {}; }
 

@@ -2,7 +2,9 @@
 
 #include <climits>
 #include <cstring>
+#include <memory>
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/PyRef.h"
 #include "module/runtime/TypeTable.h"
 #include "module/runtime/pointers.h"
@@ -13,9 +15,6 @@ namespace binding {
 namespace {
 
 constexpr uint32_t kLargestInt = 0x7FFFFFFF;
-
-static_assert(sizeof(Py_UNICODE) == sizeof(wchar_t),
-              "unicode characters cross into wide strings unconverted");
 
 TypeInfo* WideCharType() {
   static TypeInfo* type = TypeQuery("_p_wchar_t");
@@ -28,9 +27,9 @@ TypeInfo* CharType() {
 }
 
 wchar_t* CopyUnicode(PyObject* text) {
-  Py_ssize_t count = PyUnicode_GET_SIZE(text);
+  Py_ssize_t count = python_api::UnicodeLength(text);
   auto* copy = new wchar_t[count + 1];
-  std::memcpy(copy, PyUnicode_AS_UNICODE(text), count * sizeof(wchar_t));
+  python_api::CopyUnicode(text, copy, count);
   copy[count] = L'\0';
   return copy;
 }
@@ -46,7 +45,7 @@ bool InIntRange(long value) { return value >= INT_MIN && value <= INT_MAX; }
 
 int AsWideString(PyObject* object, wchar_t** address, size_t*, int* mark) {
   PyRef decoded;
-  if (PyString_Check(object)) {
+  if (python_api::IsUndecodedText(object)) {
     decoded = PyRef(PyUnicode_FromObject(object));
     if (!decoded) return STATUS_TYPE_ERROR;
     object = decoded.get();
@@ -68,14 +67,17 @@ int AsWideString(PyObject* object, wchar_t** address, size_t*, int* mark) {
 }
 
 int AsNarrowString(PyObject* object, char** address, size_t* length, int* mark) {
-  if (PyString_Check(object)) {
-    char* bytes = PyString_AS_STRING(object);
-    size_t count = PyString_GET_SIZE(object) + 1;
-    if (mark && *mark == NEWOBJ && address) {
+  if (python_api::IsNarrowText(object)) {
+    const python_api::NarrowBytes bytes(object);
+    if (!bytes) return STATUS_TYPE_ERROR;
+    size_t count = bytes.size() + 1;
+    // Bytes that die with `bytes` are copied whatever the caller asked for.
+    if (address && (!bytes.inText() || (mark && *mark == NEWOBJ))) {
       *address = new char[count];
-      std::memcpy(*address, bytes, count);
+      std::memcpy(*address, bytes.data(), count);
+      Store(mark, NEWOBJ);
     } else {
-      Store(address, bytes);
+      Store(address, bytes.data());
       Store(mark, 0);
     }
     Store(length, count);
@@ -95,6 +97,7 @@ int AsNarrowArray(PyObject* object, char* buffer, size_t size) {
   size_t count = 0;
   int mark = 0;
   if (AsNarrowString(object, &text, &count, &mark) != STATUS_OK) return STATUS_TYPE_ERROR;
+  const std::unique_ptr<char[]> copy(mark == NEWOBJ ? text : nullptr);
   if (count == size + 1 && text[size] == '\0') count = size;
   if (count > size) return STATUS_TYPE_ERROR;
   if (count) std::memcpy(buffer, text, count);
@@ -104,8 +107,8 @@ int AsNarrowArray(PyObject* object, char* buffer, size_t size) {
 
 int AsInt(PyObject* object, int* value) {
   long number = 0;
-  if (PyInt_Check(object)) {
-    number = PyInt_AS_LONG(object);
+  if (python_api::IsShortInt(object)) {
+    number = python_api::ShortIntValue(object);
   } else if (PyLong_Check(object)) {
     number = PyLong_AsLong(object);
     if (number == -1 && PyErr_Occurred()) {
@@ -122,7 +125,7 @@ int AsInt(PyObject* object, int* value) {
 }
 
 PyObject* FromNarrowArray(const char* bytes, size_t size) {
-  return PyString_FromStringAndSize(bytes, static_cast<Py_ssize_t>(size));
+  return python_api::NewNarrowText(bytes, size);
 }
 
 size_t TrimTrailingZeros(const char* bytes, size_t size) {
@@ -154,7 +157,7 @@ PyObject* FromWideMap(const std::map<std::wstring, std::wstring>& items) {
 }
 
 PyObject* FromUnsigned(uint32_t value) {
-  if (value <= kLargestInt) return PyInt_FromLong(static_cast<long>(value));
+  if (value <= kLargestInt) return python_api::NewInt(static_cast<long>(value));
   return PyLong_FromUnsignedLong(value);
 }
 

@@ -1,5 +1,6 @@
 #include "module/runtime/pointers.h"
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/ClassData.h"
 #include "module/runtime/PySwigObject.h"
 #include "module/runtime/status.h"
@@ -16,7 +17,9 @@ constexpr int kMaxThisDepth = 64;
 
 // One step of the search: the value that `object` names as "this", or empty.
 PyRef LookUpThis(PyObject* object) {
-  if (PyInstance_Check(object)) return PyRef::Borrow(_PyInstance_Lookup(object, ThisName()));
+  if (python_api::IsClassicInstance(object)) {
+    return PyRef::Borrow(python_api::ClassicInstanceLookup(object, ThisName()));
+  }
   if (PyObject** dictSlot = _PyObject_GetDictPtr(object)) {
     return PyRef::Borrow(*dictSlot ? PyDict_GetItem(*dictSlot, ThisName()) : nullptr);
   }
@@ -47,7 +50,7 @@ PySwigObject* MatchInChain(PySwigObject* object, TypeInfo* expected, void** addr
 }  // namespace
 
 PyObject* ThisName() {
-  if (!g_thisName) g_thisName = PyString_InternFromString("this");
+  if (!g_thisName) g_thisName = python_api::NewInternedText("this");
   return g_thisName;
 }
 

@@ -10,6 +10,7 @@
 #include <string>
 #include <string_view>
 
+#include "interpreter/PythonApi.h"
 #include "module/runtime/TypeInfo.h"
 #include "module/runtime/conversions.h"
 #include "module/runtime/pointers.h"
@@ -21,7 +22,7 @@ struct ReturnsNone {};
 
 // An `int` of the operation's 32-bit result.
 struct ReturnsInt {
-  PyObject* Make(int value) const { return PyInt_FromLong(value); }
+  PyObject* Make(int value) const { return python_api::NewInt(value); }
 };
 
 // An `int` below 0x80000000, else a `long`.

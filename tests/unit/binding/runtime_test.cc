@@ -35,8 +35,8 @@ bool Trusted(const char* name, Py_ssize_t size, long flags, bool (*check)(PyObje
   PyTypeObject type = StaticType::Template(name, size);
   type.tp_flags |= flags;
   PyObject object{};
-  Py_REFCNT(&object) = 1;
-  Py_TYPE(&object) = &type;
+  object.ob_refcnt = 1;
+  object.ob_type = &type;
   return check(&object);
 }
 
@@ -94,7 +94,7 @@ TEST(CallSequence, CopiesMadeBeforeARefusalOrAnExceptionAreFreed) {
     PyErr_Fetch(&type, &value, &traceback);
     PyRef held(type), message(value ? PyObject_Str(value) : nullptr), rest(value), trace(traceback);
     EXPECT_EQ(type, which == 0 ? PyExc_MemoryError : PyExc_RuntimeError);
-    EXPECT_EQ(message ? PyString_AsString(message.get()) : "", text);
+    EXPECT_EQ(message ? python_api::NarrowTextChars(message.get()) : "", text);
   }
   Type("_p_Thing");
   PyRef args(Py_BuildValue("(us)", L"copied copied copied copied copied", "not an int"));
@@ -110,8 +110,11 @@ TEST(ResultKinds, WideTextsBecomeUnicodeWithEveryCharacter) {
   const std::wstring text(L"m\u00E4\0t\U0001F600", 5);
   const auto same = [&](PyObject* object) {
     return object && PyUnicode_CheckExact(object) &&
-           std::wstring(reinterpret_cast<const wchar_t*>(PyUnicode_AS_UNICODE(object)),
-                        PyUnicode_GET_SIZE(object)) == text;
+           [object] {
+             std::wstring chars(python_api::UnicodeLength(object), L'\0');
+             python_api::CopyUnicode(object, chars.data(), chars.size());
+             return chars;
+           }() == text;
   };
   EXPECT_TRUE(same(PyRef(ReturnsUnicode{}.Make(text)).get()));
   EXPECT_TRUE(same(PyRef(ReturnsUnicodeOrNone{}.Make(text)).get()));

@@ -19,6 +19,7 @@
 #include <thread>
 #include <vector>
 
+#include "interpreter/PythonApi.h"
 #include "platform/debug_output.h"
 #include "platform/registry.h"
 #include "platform/text.h"
@@ -31,15 +32,12 @@ namespace test_support {
 // The test thread is the interpreter's main thread and holds its lock. The
 // interpreter stays up until the process ends, still reachable for leak checkers.
 inline void StartPython() {
-  if (Py_IsInitialized()) return;
-  Py_NoSiteFlag = 1;
-  Py_InitializeEx(0);
-  PyEval_InitThreads();
+  if (!Py_IsInitialized()) python_api::StartHostedInterpreter();
 }
 
 // The interpreter keeps objects in memory the leak checker cannot follow.
 extern "C" __attribute__((weak, used, visibility("default"))) const char* __lsan_default_suppressions() {
-  return "leak:libpython2.7.so\n";
+  return "leak:libpython\n";
 }
 
 inline void RunPython(const char* code) { ASSERT_EQ(PyRun_SimpleString(code), 0) << code; }

@@ -266,13 +266,12 @@ TEST_F(Windows, ProgressCarriesTheWholePercentOfAllFilesAndTheFilesTimeLeft) {
     uploader.OnFileProgress(L"/tmp/p", 1, 2, left, sent, size, 3, 4);
   }
   uploader.OnBackgroundUploadComplete(0);
-  PyObject* reports = PyDict_GetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), "reports");
-  PyObject* repr = PyObject_Repr(reports);
-  EXPECT_EQ(std::string(PyString_AsString(repr)),
-            "[(u'PROGRESS', u'ProgressChanged', 33, 9), (u'PROGRESS', u'ProgressChanged', 66, 1), "
+  // Compared as repr, so that the texts' and numbers' types count too (unicode and
+  // int on 2.7, str and int on 3).
+  RunPython("assert repr(reports) == repr(["
+            "(u'PROGRESS', u'ProgressChanged', 33, 9), (u'PROGRESS', u'ProgressChanged', 66, 1), "
             "(u'PROGRESS', u'ProgressChanged', 100, 0), (u'PROGRESS', u'ProgressChanged', 100, 0), "
-            "(u'PROGRESS', u'UploadComplete', 100, 0, u'', u'')]");
-  Py_DECREF(repr);
+            "(u'PROGRESS', u'UploadComplete', 100, 0, u'', u'')]), repr(reports)");
 }
 
 }  // namespace
