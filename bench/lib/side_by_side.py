@@ -5,7 +5,8 @@
 Each figures file is what one run printed: {"title": ..., "columns": [first
 column, value columns...], "rows": [[label, cell, ...], ...], "notes": [...],
 "ratio_of": "a/b" (optional), "ratios": "..."}. The rows of all runs line up by the first
-run's labels; each run gives its value columns under its version.
+run's labels; each run gives its value columns under its version. Anything a
+run printed after its figures (the module at interpreter exit, say) is shown.
 """
 import json
 import sys
@@ -13,12 +14,18 @@ import sys
 from bench_support import print_table
 
 
+def read_run(path):
+    """The figures of a run; what else it printed after them becomes a note."""
+    with open(path) as output:
+        text = output.read()
+    figures, end = json.JSONDecoder().raw_decode(text)
+    if text[end:].strip():
+        figures.setdefault('notes', []).append('also printed: ' + ' '.join(text[end:].split()))
+    return figures
+
+
 def read_runs(arguments):
-    runs = []
-    for version, path in zip(arguments[::2], arguments[1::2]):
-        with open(path) as figures:
-            runs.append((version, json.load(figures)))
-    return runs
+    return [(version, read_run(path)) for version, path in zip(arguments[::2], arguments[1::2])]
 
 
 def main(arguments):
