@@ -26,6 +26,11 @@ IMAGE_COUNT = 12
 _BLOCK = os.urandom(MiB)
 
 
+def argument_text(value):
+    """A command-line argument as text: 2.7 gives bytes, Python 3 text already."""
+    return value if isinstance(value, type(u'')) else value.decode('utf-8')
+
+
 def write_file(path, size):
     """A file of `size` bytes that do not compress."""
     with open(path, 'wb') as out:
