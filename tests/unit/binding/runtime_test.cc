@@ -32,6 +32,7 @@ TypeInfo* Type(const char* mangled) {
 
 // Another module's static type of that name, size and flags stands behind the object.
 bool Trusted(const char* name, Py_ssize_t size, long flags, bool (*check)(PyObject*)) {
+  test_support::StartPython();  // our own types are readied on first use
   PyTypeObject type = StaticType::Template(name, size);
   type.tp_flags |= flags;
   PyObject object{};
