@@ -23,12 +23,13 @@ build_targets() {
 # (build/ and build-py3/, or BUILD_DIR); each prints its figures as JSON, and
 # they are printed as one table.
 side_by_side() {
-  local measure=$1 work dir figures=()
+  local measure=$1 work dir builds figures=()
   shift
   work=$(mktemp -d)
   # shellcheck disable=SC2064  # the folder is known now
   trap "rm -rf '$work'" EXIT
-  for dir in $(python_build_dirs "$top"); do
+  mapfile -t builds < <(python_build_dirs "$top")
+  for dir in "${builds[@]}"; do
     PYTHONPATH=$(python_path_for "$dir") "$measure" "$dir" "$(build_python "$dir")" "$@" \
       >"$work/${#figures[@]}.json"
     figures+=("$(build_python_version "$dir")" "$work/${#figures[@]}.json")
