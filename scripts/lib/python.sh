@@ -26,13 +26,9 @@ have_python2() {
   [[ -x $(python2_path) ]]
 }
 
-# Why there is no 2.7 interpreter: the places looked at.
+# Why there is no 2.7 interpreter, where PYTHON2 does not name one: the place looked at.
 python2_missing_reason() {
-  if [[ -n ${PYTHON2:-} ]]; then
-    echo "no Python 2.7 interpreter found (PYTHON2=$PYTHON2 is not executable)"
-  else
-    echo "no Python 2.7 interpreter found (PYTHON2 is not set, nothing at $(python2_path))"
-  fi
+  echo "no Python 2.7 interpreter found (PYTHON2 is not set, nothing at $(python2_path))"
 }
 
 # The system's Python 3: Debian's, else the first on PATH.
