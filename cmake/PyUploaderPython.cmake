@@ -90,6 +90,9 @@ list(GET _info 5 _prefix)
 list(GET _info 6 PYUPLOADER_PYTHON_PLATLIB)
 list(GET _info 7 PYUPLOADER_PYTHON_PURELIB)
 
+if(_looked_at MATCHES "^PYTHON2=" AND NOT _version STREQUAL "2.7")
+  message(FATAL_ERROR "PYTHON2 names ${_python}, which is Python ${_version}, not 2.7.")
+endif()
 if(NOT _version STREQUAL "2.7" AND _version VERSION_LESS "3.8")
   message(FATAL_ERROR
     "${_python} is Python ${_version}; the module builds for Python 2.7, or 3.8 and later.")
