@@ -1,7 +1,8 @@
 // The hand-over of progress reports from the upload worker to the UI thread (the
 // interpreter's main thread), measured with the system's own classes: the proxy
 // window posts, the message queue dispatches through the interpreter's pending
-// calls, and the preset uploader calls a Python callable.
+// calls, and the preset uploader calls a Python callable. Prints its figures
+// as JSON, which bench/handover lays side by side for each interpreter.
 //
 //   build/bench/bench_handover
 //
@@ -196,16 +197,27 @@ RateResult MeasureRate(upload::CUploadProgressProxyWindow& proxy, double rate) {
 }
 
 std::string RateLabel(double rate) {
-  return rate == kFlatOut ? "flat out" : std::to_string(static_cast<long>(rate));
+  return rate == kFlatOut ? "flat out" : std::to_string(static_cast<long>(rate)) + "/s";
 }
 
-void PrintBursts(const BurstCost& bare, const BurstCost& full) {
-  std::printf("one progress report, median of %d bursts of %d (thread CPU time)\n", kBurstRounds,
-              kBurstReports);
-  std::printf("  %-48s %8.2f us\n", "worker: copy, queue, yield (the post)", full.postMicros);
-  std::printf("  %-48s %8.2f us\n", "UI thread: dispatch and command, no callable",
-              bare.dispatchMicros);
-  std::printf("  %-48s %8.2f us\n", "UI thread: dispatch and Python call", full.dispatchMicros);
+template <typename... Values>
+std::string Format(const char* format, Values... values) {
+  char text[160];
+  std::snprintf(text, sizeof text, format, values...);
+  return text;
+}
+
+// One row of the figures: a label and its cell.
+struct Row {
+  std::string label;
+  std::string cell;
+};
+
+void AddBurstRows(const BurstCost& bare, const BurstCost& full, std::vector<Row>& rows) {
+  rows.push_back({"burst: worker's post (copy, queue, yield), us", Format("%.2f", full.postMicros)});
+  rows.push_back({"burst: UI dispatch and command, no callable, us",
+                  Format("%.2f", bare.dispatchMicros)});
+  rows.push_back({"burst: UI dispatch and Python call, us", Format("%.2f", full.dispatchMicros)});
 }
 
 // What the rate runs show at their worst and best.
@@ -215,23 +227,38 @@ struct RateSummary {
   double worstUiMicros = 0;  // UI thread CPU per report in a steady flow
 };
 
-RateSummary PrintRates(upload::CUploadProgressProxyWindow& proxy) {
-  std::printf("\nworker posting for %.0f s, UI thread turning every %.0f ms\n",
-              Seconds(kRateWindow), kUiTurnSeconds * 1e3);
-  std::printf("  %10s %12s %16s %14s  %s\n", "asked /s", "posted /s", "last report ms",
-              "UI us/report", "UI kept up");
+RateSummary AddRateRows(upload::CUploadProgressProxyWindow& proxy, std::vector<Row>& rows) {
   const double idleCpu = MeasureRate(proxy, kIdle).uiCpuSeconds;
   RateSummary summary;
   for (const double rate : kRates) {
     const RateResult r = MeasureRate(proxy, rate);
     const double uiMicros = (r.uiCpuSeconds - idleCpu) / static_cast<double>(r.posted) * 1e6;
-    std::printf("  %10s %12.0f %16.1f %14.2f  %s\n", RateLabel(rate).c_str(), r.achieved,
-                r.lagSeconds * 1e3, uiMicros, r.keptUp ? "yes" : "no");
+    rows.push_back({"rate asked " + RateLabel(rate),
+                    Format("%.0f/s %.1f ms %.2f us %s", r.achieved, r.lagSeconds * 1e3, uiMicros,
+                           r.keptUp ? "yes" : "no")});
     if (r.keptUp) summary.sustained = std::max(summary.sustained, r.achieved);
     if (rate == kFlatOut) summary.flatOut = r.achieved;
     summary.worstUiMicros = std::max(summary.worstUiMicros, uiMicros);
   }
   return summary;
+}
+
+// The figures as JSON for bench/lib/side_by_side.py; no text here holds a
+// character that JSON would escape.
+void PrintFigures(const std::vector<Row>& rows, const std::string& ratios) {
+  std::printf("{\"title\": \"one progress report from the worker to the UI thread, thread CPU "
+              "time, median of %d bursts of %d\",\n \"columns\": [\"measure\", \"figure\"],\n"
+              " \"rows\": [",
+              kBurstRounds, kBurstReports);
+  const char* separator = "";
+  for (const Row& row : rows) {
+    std::printf("%s\n  [\"%s\", \"%s\"]", separator, row.label.c_str(), row.cell.c_str());
+    separator = ",";
+  }
+  std::printf("],\n \"notes\": [\"rates: the worker posts for %.0f s while the UI thread turns "
+              "every %.0f ms; a cell: posted /s, last report's delay, UI thread time per report, "
+              "kept up\"],\n \"ratios\": \"%s\"}\n",
+              Seconds(kRateWindow), kUiTurnSeconds * 1e3, ratios.c_str());
 }
 
 }  // namespace
@@ -248,23 +275,24 @@ int main() {
   uploader.SetCallback(Interpreter::Global("report"));
   const BurstCost full = MedianBurst(proxy);
   if (Interpreter::Delivered() != kBurstReports) {
-    std::printf("FAIL: %ld of %d reports reached the callable\n", Interpreter::Delivered(),
-                kBurstReports);
+    std::fprintf(stderr, "FAIL: %ld of %d reports reached the callable\n",
+                 Interpreter::Delivered(), kBurstReports);
     return 1;
   }
-  PrintBursts(bare, full);
-  const RateSummary rates = PrintRates(proxy);
+  std::vector<Row> rows;
+  AddBurstRows(bare, full, rows);
+  const RateSummary rates = AddRateRows(proxy, rows);
 
   const double worstUi = std::max(full.dispatchMicros, rates.worstUiMicros);
   // With reports queued up, as at capacity, each costs what a burst shows.
   const double uiCapacity = 1e6 / full.dispatchMicros;
-  std::printf("\ntarget: UI thread time per report < %.0f us: worst %.2f us, %s\n", kTargetMicros,
-              worstUi, worstUi < kTargetMicros ? "met" : "MISSED");
-  std::printf("the UI kept up with %.0f reports/s; at its burst cost it could take %.0f/s\n",
-              rates.sustained, uiCapacity);
-  std::printf("ratios: ui_per_report/target %.3f  python_call/dispatch_only %.2f  "
-              "ui_capacity/worker_flat_out %.2f\n",
-              worstUi / kTargetMicros, full.dispatchMicros / bare.dispatchMicros,
-              uiCapacity / rates.flatOut);
+  rows.push_back({Format("UI time per report, worst (target < %.0f us), us", kTargetMicros),
+                  Format("%.2f %s", worstUi, worstUi < kTargetMicros ? "met" : "MISSED")});
+  rows.push_back({"highest rate the UI kept up with, /s", Format("%.0f", rates.sustained)});
+  rows.push_back({"UI capacity at its burst cost, /s", Format("%.0f", uiCapacity)});
+  PrintFigures(rows, Format("ui_per_report/target %.3f  python_call/dispatch_only %.2f  "
+                            "ui_capacity/worker_flat_out %.2f",
+                            worstUi / kTargetMicros, full.dispatchMicros / bare.dispatchMicros,
+                            uiCapacity / rates.flatOut));
   return 0;
 }

@@ -24,6 +24,17 @@ VERSION = u"5.0"
 VERSION_TYPE = u"Retail"
 MACHINE_ID = u"7f3c2a10-demo-0000-0000-000000000001"
 BAR_WIDTH = 40
+TEXT = type(u"")
+
+
+def argument_text(value):
+    """A command-line argument as text: 2.7 gives bytes, Python 3 text already."""
+    return value if isinstance(value, TEXT) else value.decode("utf-8")
+
+
+def output_text(text):
+    """Text for an output stream: 2.7's take UTF-8 bytes, Python 3's take text."""
+    return text if str is TEXT else text.encode("utf-8")
 
 
 def png_bytes(width, height):
@@ -141,7 +152,7 @@ class ProgressReport(object):
 
 def sign_in(args):
     session = OBLoginData(VERSION, VERSION_TYPE, MACHINE_ID)
-    if not session.LoginOrbishare(args.account.decode("utf-8"), args.password.decode("utf-8")):
+    if not session.LoginOrbishare(argument_text(args.account), argument_text(args.password)):
         sys.exit("Sign-in failed: check the account and the service.")
     print(u"Signed in as %s on %s" % (session.GetUserName(), session.GetServerUrl()))
     return session
@@ -149,7 +160,8 @@ def sign_in(args):
 
 def choose_category(session):
     categories = session.GetPresetCategory(u"ENU") or {}
-    for category_id in sorted(categories, key=lambda k: int(k) if k.isdigit() else k):
+    # Numeric ids in number order before the others, as 2.7 orders int and text.
+    for category_id in sorted(categories, key=lambda k: (0, int(k)) if k.isdigit() else (1, k)):
         print(u"  category %s: %s" % (category_id, categories[category_id]))
     return sorted(categories)[0] if categories else u""
 
@@ -212,7 +224,7 @@ def main():
     finally:
         shutil.rmtree(folder, ignore_errors=True)
 
-    display.outcome(outcome_line(report, cancelled).encode("utf-8"))
+    display.outcome(output_text(outcome_line(report, cancelled)))
     return 0 if report.success else 1
 
 

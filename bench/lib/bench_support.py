@@ -1,7 +1,9 @@
 """What the benchmarks share: the preset they publish, files to publish, the
 process's resident memory, the engine's chunk log, waiting for the completion
-report and printing tables. Python 2.7, like the module; it never imports the
-module itself, so a driver may use it without loading the module."""
+report and printing tables. Python 2.7 and 3, like the module; it never imports
+the module itself, so a driver may use it without loading the module."""
+from __future__ import print_function
+
 import os
 import time
 
@@ -22,6 +24,11 @@ TEXTS = (u'golden-hour', u'Golden h\xf6ur', u'7', u'warm,sunset', u'Soft warm li
 IMAGE_COUNT = 12
 
 _BLOCK = os.urandom(MiB)
+
+
+def argument_text(value):
+    """A command-line argument as text: 2.7 gives bytes, Python 3 text already."""
+    return value if isinstance(value, type(u'')) else value.decode('utf-8')
 
 
 def write_file(path, size):
@@ -105,5 +112,5 @@ def print_table(header, rows):
     cells = [list(header)] + [[str(cell) for cell in row] for row in rows]
     widths = [max(len(row[i]) for row in cells) for i in range(len(header))]
     for row in cells:
-        print '  '.join(cell.ljust(width) if i == 0 else cell.rjust(width)
-                        for i, (cell, width) in enumerate(zip(row, widths)))
+        print('  '.join(cell.ljust(width) if i == 0 else cell.rjust(width)
+                        for i, (cell, width) in enumerate(zip(row, widths))))

@@ -3,14 +3,14 @@ argument, beside Python code of the same shape (bench/calls).
 
 Each figure is the best of many short timeit runs, the two sides taking turns
 so that a busy spell of the machine hits both; timeit's loop is included and
-both sides pay the same loop.
+both sides pay the same loop. Prints the figures as JSON, for side_by_side.py.
 """
+import json
 import sys
 import timeit
 
 import _PyUploader as native
 import PyUploader
-import bench_support
 
 NUMBER = 200000
 REPEAT = 25
@@ -72,10 +72,10 @@ def main():
         rows.append([label, '%.0f' % module_ns, '%.0f' % python_ns,
                      '%.2f' % (module_ns / python_ns)])
         ratios.append('%s %.2f' % (label.split(':')[0].replace(' ', '_'), module_ns / python_ns))
-    print 'ns per call, best of %d x %d calls, Python %s' % (REPEAT, NUMBER,
-                                                          sys.version.split()[0])
-    bench_support.print_table(['call', 'module ns', 'python ns', 'module/python'], rows)
-    print 'ratios (module/python): %s' % '  '.join(ratios)
+    json.dump({'title': 'ns per call, best of %d x %d calls' % (REPEAT, NUMBER),
+               'columns': ['call (ns)', 'module', 'python', 'module/python'],
+               'rows': rows, 'notes': ['Python %s' % sys.version.split()[0]],
+               'ratio_of': 'module/python', 'ratios': '  '.join(ratios)}, sys.stdout)
     return 0
 
 

@@ -82,19 +82,19 @@ def main():
     runs.sort(key=lambda run: run[0])
     within = sum(1 for latency, (_, write) in runs if latency <= write + ALLOWANCE)
     median, worst = runs[len(runs) // 2], runs[-1]
-    print ('cancel while a 1 GiB preset file streams: %d runs, cancel after %.1f to %.1f s'
+    print('cancel while a 1 GiB preset file streams: %d runs, cancel after %.1f to %.1f s'
            % (len(runs), EARLIEST_CANCEL, LATEST_CANCEL))
-    print ('from CancelUpload to the "UploadComplete" report; bound = write time of the chunk '
+    print('from CancelUpload to the "UploadComplete" report; bound = write time of the chunk '
            'in flight + %d ms' % (ALLOWANCE * 1e3))
     bs.print_table(['run', 'ms', 'chunk MiB', 'chunk write ms', 'bound ms', 'within'],
                    [percentile_row('median', median),
                     percentile_row('90th percentile', runs[int(len(runs) * 0.9) - 1]),
                     percentile_row('worst', worst)])
-    print 'target: worst within its bound: %s (%d of %d runs within theirs)' % (
-        'met' if worst[0] <= worst[1][1] + ALLOWANCE else 'MISSED', within, len(runs))
-    print 'ratios: median/bound %.2f  worst/bound %.2f  worst/median %.2f' % (
+    print('target: worst within its bound: %s (%d of %d runs within theirs)' % (
+        'met' if worst[0] <= worst[1][1] + ALLOWANCE else 'MISSED', within, len(runs)))
+    print('ratios: median/bound %.2f  worst/bound %.2f  worst/median %.2f' % (
         median[0] / (median[1][1] + ALLOWANCE), worst[0] / (worst[1][1] + ALLOWANCE),
-        worst[0] / median[0])
+        worst[0] / median[0]))
     return 0 if within == len(runs) else 1
 
 

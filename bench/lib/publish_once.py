@@ -36,4 +36,4 @@ def publish(paths):
 
 
 if __name__ == '__main__':
-    print json.dumps(publish([path.decode('utf-8') for path in sys.argv[1:]]))
+    print(json.dumps(publish([bench_support.argument_text(path) for path in sys.argv[1:]])))

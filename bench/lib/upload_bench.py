@@ -173,13 +173,13 @@ def print_targets(results):
                       % (name, module['wall'] / curl['wall'], cpu_ratio,
                          module['floor'] / module['wall'], module['growth_mib'],
                          no_pause_wall_ratio, no_pause_cpu_ratio))
-    print 'targets:'
-    print '  overhead above the pacing floor < %d%% of wall: %s' % (100 * OVERHEAD_TARGET,
-                                                                   ', '.join(overheads))
-    print '  CPU per GiB <= %.1fx curl\'s: %s' % (CPU_RATIO_TARGET, ', '.join(cpus))
-    print '  peak memory growth <= %d MiB: %s' % (GROWTH_TARGET_MIB, ', '.join(growths))
-    print '  wall at pause 0 over curl\'s: %s' % ', '.join(walls)
-    print 'ratios (module/curl): %s' % ' | '.join(ratios)
+    print('targets:')
+    print('  overhead above the pacing floor < %d%% of wall: %s' % (100 * OVERHEAD_TARGET,
+                                                                   ', '.join(overheads)))
+    print('  CPU per GiB <= %.1fx curl\'s: %s' % (CPU_RATIO_TARGET, ', '.join(cpus)))
+    print('  peak memory growth <= %d MiB: %s' % (GROWTH_TARGET_MIB, ', '.join(growths)))
+    print('  wall at pause 0 over curl\'s: %s' % ', '.join(walls))
+    print('ratios (module/curl): %s' % ' | '.join(ratios))
 
 
 def main():
@@ -200,10 +200,10 @@ def main():
         payload = preset_size + (bs.IMAGE_COUNT + 1) * image_size
         results.append((name, dict((side, summarize(runs[side], payload)) for side in SIDES),
                         same_bytes(runs)))
-    print ('upload of a preset (fifteen fields, fourteen files) to %s, medians of %d runs per side'
+    print('upload of a preset (fifteen fields, fourteen files) to %s, medians of %d runs per side'
            % (UPLOAD_URL, args.repeat))
-    print 'sizes: realistic = 100 KB preset + 12 x 300 KB images; large = 1 GiB preset + the same'
-    print ('wall and CPU (user + system): module from StartUpload to the completion report, '
+    print('sizes: realistic = 100 KB preset + 12 x 300 KB images; large = 1 GiB preset + the same')
+    print('wall and CPU (user + system): module from StartUpload to the completion report, '
            'curl for its whole process')
     rows = []
     for name, summaries, same in results:
