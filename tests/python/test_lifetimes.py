@@ -10,7 +10,7 @@ import weakref
 
 import _PyUploader as native
 import PyUploader
-from fixtures import (DETECTION_HOST, SERVER_HOST, STAGING_HOST, Reports, Test, UploadTest, pump,
+from fixtures import (DETECTION_HOST, SERVER_HOST, STAGING_HOST, Test, UploadTest, pump,
                       run_python, wait_until, xml_reply)
 
 DROP_ROUNDS = 300
@@ -131,7 +131,7 @@ class CallableLetGoDuringItsCall(UploadTest):
     def test_the_callable_lives_until_its_call_has_returned_and_no_longer(self):
         # Its only reference is the uploader's; on its first report it lets go of itself.
         for way, let_go in [('unregisters itself', lambda holder: holder[0].SetCallback(None)),
-                            ('replaces itself', lambda holder: holder[0].SetCallback(Reports())),
+                            ('replaces itself', lambda holder: holder[0].SetCallback(self.reports)),
                             ('drops its uploader', lambda holder: holder.pop())]:
             holder, alive_after = [self.new_uploader()], []
 
@@ -144,6 +144,8 @@ class CallableLetGoDuringItsCall(UploadTest):
             del once
             self.assertEqual(self.start(uploader=holder[0]), 1, way)
             wait_until(lambda: alive_after, 30.0, 'first report')
+            if way == 'replaces itself':  # the new callable gets the rest
+                self.assertEqual(self.completion()[3:5], (1, u'http://api.orbishare.com/template/view.jsp?id=5001'))
             del holder[:]
             pump(0.05)
             self.assertEqual((alive_after, held()), ([True], None), way)
