@@ -62,9 +62,6 @@ class ThroughTheProxy(UploadTest):
             logged = LOGGED_REQUEST.findall(log.read())[getattr(self, 'logged_before', 0):]
         return [(method, target.split('?')[0]) for method, target in logged]
 
-    def via(self, host, path):
-        return [request.header('Via') for request in self.svc.requests(host=host, path=path)]
-
     def test_discovery_categories_and_the_upload_go_through_it_and_sign_in_tunnels_verified(self):
         self.call('InitOBServerURL')
         self.assertEqual(self.call('GetServerUrl'), text_type(SERVER_HOST))
@@ -76,9 +73,6 @@ class ThroughTheProxy(UploadTest):
             ('POST', 'http://%s%s' % (SERVER_HOST, CATEGORIES)), ('POST', 'http://%s%s' % (SERVER_HOST, UPLOAD_PATH)),
             ('GET', 'http://%s/' % DEFAULT_HOST), ('CONNECT', '%s:443' % SERVER_HOST)])
         self.assertEqual(self.uploads()[0].complete, True)
-        vias = sum([self.via(host, path) for host, path in (
-            (DETECTION_HOST, OBSERVER), (SERVER_HOST, CATEGORIES), (SERVER_HOST, UPLOAD_PATH))], [])
-        self.assertEqual([via.split(' (')[0] for via in vias], ['1.1 testproxy'] * 3)
         [sign_in] = self.svc.requests(host=SERVER_HOST, path=SIGN_IN)
         self.assertEqual((sign_in.tls, sign_in.header('Via')), (True, None))  # an opaque tunnel
         self.svc.reset()
@@ -92,7 +86,7 @@ class ThroughTheProxy(UploadTest):
         self.logged_before += len(self.proxied())
         self.call('GetPresetCategory', u'ENU')
         self.assertEqual(self.call('LoginOrbishare', u'member', u'secret'), 1)
-        self.assertEqual((self.proxied(), self.via(SERVER_HOST, CATEGORIES)), ([], [None]))
+        self.assertEqual(self.proxied(), [])
 
 
 if __name__ == '__main__':

@@ -69,7 +69,7 @@ class Publishing(UploadTest):
         # Read slowly, the files span half-seconds: a speed is measured and kept.
         preset_size = 2 * 1024 * 1024
         self.replace_files(preset_size=preset_size)
-        self.slow_reader(2 * 1024 * 1024)
+        self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=2 * 1024 * 1024)])
         self.assertEqual(self.uploader.GetUploadedFileUrl(), u'')
         self.start()
         self.wait_for_progress()
@@ -159,13 +159,13 @@ class Stopping(UploadTest):
     def setUp(self):
         UploadTest.setUp(self)
         self.replace_files(preset_size=24 * 1024 * 1024)
-        self.slow_reader(1024 * 1024)
+        self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=1024 * 1024)])
 
     def test_a_cancel_while_streaming_completes_at_once_and_reports_no_earlier_success(self):
         self.svc.reset()  # a quick first upload
         self.start()
         self.assertEqual(self.completion()[3], 1)
-        self.slow_reader(1024 * 1024)
+        self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=1024 * 1024)])
         second = Reports()
         self.uploader.SetCallback(second)
         self.assertEqual(self.start(), 1)
@@ -185,7 +185,8 @@ class Stopping(UploadTest):
         # reference cycle (never collected: its worker still runs when the process ends).
         for in_cycle in (False, True):
             self.svc.reset()
-            self.slow_reader(8 * 1024 * 1024)  # what the socket buffers hold drains soon
+            # read fast, as what the socket buffers hold drains soon
+            self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=8 * 1024 * 1024)])
             started = time.time()
             code, out, err = run_python('''
                 from fixtures import Reports, SESSION, TEXTS, wait_until
