@@ -183,8 +183,8 @@ class Arguments(Objects):
         self.assertRaises(ValueError, native.infoEffectURL_strTag_set, self.record, None)
         value = native.infoEffectURL_strTag_get(self.record)
         self.assertEqual(peer.CString_value(value), u'kept')
-        for made in (kept, value):
-            peer.delete_CString(made)
+        peer.delete_CString(kept)
+        peer.delete_CString(value)
 
         class Text(text_type):
             pass

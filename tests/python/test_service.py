@@ -199,11 +199,8 @@ class SignIn(SessionTest):
             self.assertEqual((self.state(), lines), ((u'', user_name), trace), document)
 
     def test_refusals_before_anything_is_sent_and_refused_certificates(self):
-        for account, password in [(u'', PASSWORD), (ACCOUNT, u'')]:
-            self.clear_trace()
-            self.assertEqual(self.login(account, password), 0)
-            self.assertEqual(self.trace(), [u'Login OB fail: Empty user name or password'])
-        self.assertEqual(self.svc.requests(), [])
+        self.assertEqual((self.login(u'', PASSWORD), self.login(ACCOUNT, u''), self.svc.requests()), (0, 0, []))
+        self.assertEqual(self.trace(), [u'Login OB fail: Empty user name or password'] * 2)
         self.svc.host_state(DEFAULT_HOST, 'down')
         self.assertEqual(self.login(), 0)
         self.assertEqual(self.trace()[-1], u'Login OB fail: Can not reach the OB server')
@@ -231,7 +228,7 @@ class SignIn(SessionTest):
         self.assertEqual([self.call(getter) for getter in GETTERS], links(STAGING_HOST, '', '', '', ''))
 
 
-class Categories(SessionTest):
+class CategoriesRelatedVideoEffectsAndLinks(SessionTest):
 
     def categories(self, document, language=u'DEU'):
         if document is not None:
@@ -240,10 +237,9 @@ class Categories(SessionTest):
 
     def name_of(self, category_id):
         text = peer.new_CString(u'unchanged')
-        try:
-            return self.call('GetCategroyName', category_id, text), peer.CString_value(text)
-        finally:
-            peer.delete_CString(text)
+        found = self.call('GetCategroyName', category_id, text), peer.CString_value(text)
+        peer.delete_CString(text)
+        return found
 
     def test_the_map_grows_from_each_reply_and_names_are_found_by_id(self):
         self.call('SetOBURLAsReg', SERVER)
@@ -278,8 +274,6 @@ class Categories(SessionTest):
         self.assertEqual((len(many) - len(expected), many[u'100000'], many[u'109999']), (10000, u'C100000', u'C109999'))
         self.assertEqual(self.trace(), [u'GetPresetCategory: only the first 10000 categories of the reply are kept.'])
 
-
-class RelatedVideoEffectsAndLinks(SessionTest):
     QUERY = '&AP=KRV&Version=5.0&versionType=Retail&uuid=machine-1'
     ID_REPLY = xml_reply(u'<info><videoId>V42</videoId></info>')
 
