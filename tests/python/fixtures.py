@@ -56,10 +56,6 @@ def xml_reply(xml, status=200, **options):
     return reply(xml, status, [['Content-Type', 'text/xml; charset=UTF-8']], **options)
 
 
-def raw(data):
-    return reply(raw_b64=b64(data))
-
-
 def _decode(value):
     if isinstance(value, dict):
         if list(value) == ['base64']:
@@ -69,8 +65,8 @@ def _decode(value):
 
 
 class Recorded(object):
-    """A recorded request (method, target, path, head, headers, body, body_size, complete,
-    host, port, tls, upload) or multipart part (kind, name, filename, size, sha256, content)."""
+    """A recorded request (method, target, path, head, headers, body, body_size, complete, host,
+    port, tls, upload) or multipart part (kind, name, filename, size, sha256, content)."""
 
     def __init__(self, document):
         for key, value in document.items():
@@ -311,9 +307,6 @@ class UploadTest(Test):
 
     def wait_for_progress(self, reports=None):
         wait_until(lambda: [r for r in (reports or self.reports).progress() if r[2] > 0], 30.0, 'progress')
-
-    def slow_reader(self, bytes_per_second):
-        self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=bytes_per_second)])
 
     def uploads(self, bodies=True):
         return self.svc.requests(host=SERVER_HOST, path=UPLOAD_PATH, bodies=bodies)

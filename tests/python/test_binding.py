@@ -183,8 +183,8 @@ class Arguments(Objects):
         self.assertRaises(ValueError, native.infoEffectURL_strTag_set, self.record, None)
         value = native.infoEffectURL_strTag_get(self.record)
         self.assertEqual(peer.CString_value(value), u'kept')
-        for made in (kept, value):
-            peer.delete_CString(made)
+        peer.delete_CString(kept)
+        peer.delete_CString(value)
 
         class Text(text_type):
             pass
@@ -234,7 +234,7 @@ class Arguments(Objects):
 # Run in a fresh interpreter per import order: registered classes and the ring
 # belong to the process. The output is the evidence.
 SCENARIO = '''from __future__ import print_function
-import gc, sys
+import sys
 %s
 print(sorted(n for n in dir(sys.modules['swig_runtime_data3']) if not n.startswith('__')))
 text = peer.new_CString(u'peer made')
@@ -253,20 +253,12 @@ for cls in (NewStyle, Classic):
     print(type(value).__name__, type(this).__name__, this.own(), peer.CString_value(value))
     del value, this
 made = native.new_infoEffectURL(text, text, text)
-print(type(made).__name__)
-native.delete_infoEffectURL(made)
-del made
+print(type(made).__name__, native.delete_infoEffectURL(made))
 calls = []
-def destroy(obj):
-    calls.append(obj.own())
-    native.delete_infoEffectURL(obj)
-class Recorded(object):
-    __swig_destroy__ = staticmethod(destroy)
-class Failing(object):
-    __swig_destroy__ = staticmethod(lambda obj: 1 / 0)
-class NoDestroy(object):
-    pass
-for cls in (Recorded, Failing, NoDestroy):
+destroyers = [('Recorded', lambda obj: calls.append(obj.own()) or native.delete_infoEffectURL(obj)),
+              ('Failing', lambda obj: 1 / 0), ('NoDestroy', None)]
+for name, destroy in destroyers:
+    cls = type(name, (object,), dict(__swig_destroy__=staticmethod(destroy)) if destroy else {})
     native.infoEffectURL_swigregister(cls)
     made = cls()
     made.this = native.new_infoEffectURL(text, text, text)
@@ -279,7 +271,7 @@ native.delete_infoEffectURL(record)
 '''
 EXPECTED = ("['type_pointer']\nTrue peer made\n"
             "NewStyle PySwigObject True peer made\n%s PySwigObject True peer made\n"
-            "PySwigObject\n"
+            "PySwigObject None\n"
             "Recorded [False] KeyError\nFailing [False] KeyError\n"
             "swig/python detected a memory leak of type 'infoEffectURL *', no destructor found.\n"
             "NoDestroy [False] KeyError\n") % ('instance' if PY2 else 'Classic')

@@ -7,7 +7,7 @@ import re
 import unittest
 
 import _PyUploader as native
-from fixtures import (DETECTION_HOST, SERVER_HOST, STAGING_HOST, UPLOAD_PATH, UploadTest, counts, raw, reply,
+from fixtures import (DETECTION_HOST, SERVER_HOST, STAGING_HOST, UPLOAD_PATH, UploadTest, b64, counts, reply,
                       settled, text_type)
 
 XML = ['Content-Type', 'text/xml; charset=UTF-8']
@@ -68,7 +68,7 @@ def head_announcing(length):
 
 def cut_short(document):
     whole = document % b'kept'
-    return raw(head_announcing(len(whole)) + whole[:len(whole) // 2])
+    return reply(raw_b64=b64(head_announcing(len(whole)) + whole[:len(whole) // 2]))
 
 
 def in_slot(text, prefix=b''):
@@ -79,8 +79,8 @@ def in_slot(text, prefix=b''):
 FAULTS = [
     ('dropped unanswered', lambda document: reply(abort_after=0), FAILED),
     ('cut short', cut_short, FAILED),
-    ('not HTTP', lambda document: raw(GARBAGE), FAILED),
-    ('announcing 100 MiB', lambda document: raw(head_announcing(100 << 20) + document % b'kept'),
+    ('not HTTP', lambda document: reply(raw_b64=b64(GARBAGE)), FAILED),
+    ('announcing 100 MiB', lambda document: reply(raw_b64=b64(head_announcing(100 << 20) + document % b'kept')),
      FAILED),
     ('nested 100,000 deep', in_slot(b'<a>' * NESTING + b'deep' + b'</a>' * NESTING), u'deep'),
     ('billion laughs', in_slot(b'&lol9;', LAUGHS), u'&lol9;'),

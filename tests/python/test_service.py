@@ -52,10 +52,8 @@ class Discovery(SessionTest):
         fields = dict(APIUrl='api2.example.test', AdjustmentPreset='/presets?x=1', SignUp='/join?a=1',
                       ForgetPassword='/lost?b=2', LensCorrection='/lens?c=3', VideoGallery='/v?d=4')
         self.assertEqual(self.discover(xml_reply(info_xml(**fields))), u'api2.example.test')
-        self.assertEqual(self.trace(), [
-            u'KRV SignUp = /join?a=1', u'KRV ForgetPassword = /lost?b=2',
-            u'KRV LensCorrection = /lens?c=3', u'KRV VideoGallery = /v?d=4',
-            u'Get OB server URL from server. URL = api2.example.test'])
+        self.assertEqual(self.trace(), [u'KRV %s = %s' % (name, fields[name]) for name in (
+            'SignUp', 'ForgetPassword', 'LensCorrection', 'VideoGallery')] + [FALLBACK[0] + u'api2.example.test'])
         self.assertEqual([self.call(getter) for getter in GETTERS],
                          links('api2.example.test', '/presets?x=1', '/join?a=1', '/lost?b=2', '/lens?c=3'))
         self.discover()
@@ -110,35 +108,33 @@ class Discovery(SessionTest):
     def test_a_silent_host_is_given_up_at_the_limit_and_no_handle_python_wrote_is_closed(self):
         # Answered, the probe closes its handles itself; silent, the waiting thread
         # closes them: neither may close a foreign value written from Python meanwhile.
-        cells = [self.call(m + '_get') for m in ('m_hInternet', 'm_hConnect')]
+        cells = dict((m, self.call(m + '_get')) for m in ('m_hInternet', 'm_hConnect'))
         stop = threading.Event()
 
         def overwrite():
-            while not stop.is_set():
-                self.call('m_hInternet_set', cells[0])
-                self.call('m_hConnect_set', cells[1])
-                time.sleep(0.001)
+            while not stop.wait(0.001):
+                for member, handle in cells.items():
+                    self.call(member + '_set', handle)
         for delay, host in ((0.5, SERVER), (PROBE_LIMIT + 1, STAGING)):
-            for handle in cells:
+            for handle in cells.values():
                 cell(handle).value = 0x1000
             self.call('LogoutOrbishare')
             self.clear_trace()
             self.svc.reset()
             self.svc.script(DETECTION_HOST, '/', [reply(delay=delay)])
+            stop.clear()
             writer = threading.Thread(target=overwrite)
             writer.start()
             started = time.time()
-            try:
-                with Ticker() as ticker:
-                    self.assertEqual(self.discover(), host)
-            finally:
-                stop.set()
-                writer.join()
-                stop.clear()
+            with Ticker() as ticker:
+                host_found = self.discover()
+            stop.set()
+            writer.join()
+            self.assertEqual(host_found, host)
         elapsed = time.time() - started
         self.assertTrue(PROBE_LIMIT - 0.1 <= elapsed < PROBE_LIMIT + 2.0, elapsed)
         self.assertGreater(ticker.ticks, 50, 'other Python threads were held up')
-        self.assertEqual(([cell(c).value for c in cells], self.call('m_bServerReachable_get'), self.trace(),
+        self.assertEqual(([cell(c).value for c in cells.values()], self.call('m_bServerReachable_get'), self.trace(),
                           self.sent(OBSERVER, DETECTION_HOST)), ([0x1000, 0x1000], 0, FALLBACK, []))
 
 
@@ -176,11 +172,9 @@ class SignIn(SessionTest):
         self.call('SetOBURLAsReg', STAGING)  # a host set by the application: no detection
         token = u't' * 400  # long values are kept whole
         self.svc.script(STAGING_HOST, SIGN_IN, [xml_reply(info_xml('info', tokenid=token))])
-        self.assertEqual(self.login(u'a' * 3000, u'&' * 1000), 1)
-        self.assertEqual([(r.host, r.path) for r in self.svc.requests()], [(DEFAULT_HOST, '/'), (STAGING_HOST, SIGN_IN)])
-        self.assertEqual(self.call('GetLoginTokenID'), token)
-        self.assertTrue(self.sent(SIGN_IN, STAGING_HOST)[0].body.startswith(
-            b'account=' + b'a' * 3000 + b'&pwd=' + b'%26' * 1000 + b'&AP=KRV'))
+        self.assertEqual((self.login(u'a' * 3000, u'&' * 1000), self.call('GetLoginTokenID')), (1, token))
+        self.assertEqual([(r.host, r.path, r.body.split(b'&AP=')[0]) for r in self.svc.requests()], [
+            (DEFAULT_HOST, '/', b''), (STAGING_HOST, SIGN_IN, b'account=' + b'a' * 3000 + b'&pwd=' + b'%26' * 1000)])
         self.call('SetOBURLAsReg', u'')  # unknown again
         self.assertEqual((self.call('InitOBServerURL'), self.call('GetServerUrl')), (None, SERVER))
 
@@ -205,11 +199,8 @@ class SignIn(SessionTest):
             self.assertEqual((self.state(), lines), ((u'', user_name), trace), document)
 
     def test_refusals_before_anything_is_sent_and_refused_certificates(self):
-        for account, password in [(u'', PASSWORD), (ACCOUNT, u'')]:
-            self.clear_trace()
-            self.assertEqual(self.login(account, password), 0)
-            self.assertEqual(self.trace(), [u'Login OB fail: Empty user name or password'])
-        self.assertEqual(self.svc.requests(), [])
+        self.assertEqual((self.login(u'', PASSWORD), self.login(ACCOUNT, u''), self.svc.requests()), (0, 0, []))
+        self.assertEqual(self.trace(), [u'Login OB fail: Empty user name or password'] * 2)
         self.svc.host_state(DEFAULT_HOST, 'down')
         self.assertEqual(self.login(), 0)
         self.assertEqual(self.trace()[-1], u'Login OB fail: Can not reach the OB server')
@@ -237,7 +228,7 @@ class SignIn(SessionTest):
         self.assertEqual([self.call(getter) for getter in GETTERS], links(STAGING_HOST, '', '', '', ''))
 
 
-class Categories(SessionTest):
+class CategoriesRelatedVideoEffectsAndLinks(SessionTest):
 
     def categories(self, document, language=u'DEU'):
         if document is not None:
@@ -246,10 +237,9 @@ class Categories(SessionTest):
 
     def name_of(self, category_id):
         text = peer.new_CString(u'unchanged')
-        try:
-            return self.call('GetCategroyName', category_id, text), peer.CString_value(text)
-        finally:
-            peer.delete_CString(text)
+        found = self.call('GetCategroyName', category_id, text), peer.CString_value(text)
+        peer.delete_CString(text)
+        return found
 
     def test_the_map_grows_from_each_reply_and_names_are_found_by_id(self):
         self.call('SetOBURLAsReg', SERVER)
@@ -284,8 +274,6 @@ class Categories(SessionTest):
         self.assertEqual((len(many) - len(expected), many[u'100000'], many[u'109999']), (10000, u'C100000', u'C109999'))
         self.assertEqual(self.trace(), [u'GetPresetCategory: only the first 10000 categories of the reply are kept.'])
 
-
-class RelatedVideoEffectsAndLinks(SessionTest):
     QUERY = '&AP=KRV&Version=5.0&versionType=Retail&uuid=machine-1'
     ID_REPLY = xml_reply(u'<info><videoId>V42</videoId></info>')
 
@@ -349,10 +337,6 @@ class RelatedVideoEffectsAndLinks(SessionTest):
             SERVER_HOST, '/community/presets.jsp?ap=lumivanta', '/member/signUp.jsp?ap=lumivanta',
             '/member/forgetpwd.jsp?ap=lumivanta', '/lens/correction.jsp?ap=lumivanta'))
         self.new_session()
-        self.svc.host_state(DETECTION_HOST, 'down')
-        self.assertEqual([self.call(getter) for getter in GETTERS[1:]], links(
-            STAGING_HOST, 'http://%s/signUp' % DEFAULT_HOST, 'http://%s/forgetpwd' % DEFAULT_HOST, ''))
-        self.svc.reset()
         self.call('SetOBURLAsReg', u'h%41st')
         self.assertTrue(self.call('GetSignUpURL').startswith(u'http://hAst'))
         self.call('SetOBURLAsReg', SERVER)

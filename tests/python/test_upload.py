@@ -1,7 +1,6 @@
 """Publishing a preset: the form on the wire, the reports the callable receives, the
 service's answers, refused starts, cancel and an uploader destroyed while it works."""
 # ctest timeout: 90
-import gc
 import hashlib
 import io
 import os
@@ -10,8 +9,8 @@ import threading
 import time
 import unittest
 
-from fixtures import (MAIN_THREAD, PY2, SERVER_HOST, SESSION, UPLOAD_PATH, Reports, UploadTest, counts, pump,
-                      reply, run_python, settled, wait_until, xml_reply)
+from fixtures import (MAIN_THREAD, PY2, SERVER_HOST, SESSION, UPLOAD_PATH, Reports, UploadTest, pump, reply,
+                      run_python, wait_until, xml_reply)
 
 FIRST_URL = u'http://api.orbishare.com/template/view.jsp?id=5001'
 SECOND_URL = u'http://api.orbishare.com/template/view.jsp?id=5002'
@@ -70,14 +69,12 @@ class Publishing(UploadTest):
         # Read slowly, the files span half-seconds: a speed is measured and kept.
         preset_size = 2 * 1024 * 1024
         self.replace_files(preset_size=preset_size)
-        self.slow_reader(2 * 1024 * 1024)
+        self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=2 * 1024 * 1024)])
         self.assertEqual(self.uploader.GetUploadedFileUrl(), u'')
-        began = time.time()
         self.start()
         self.wait_for_progress()
         self.assertEqual((self.start(texts=SECOND_TEXTS), self.uploader.GetUploadedFileUrl()), (0, u''))
         self.assertEqual(self.completion()[3:5], (1, FIRST_URL))
-        elapsed = time.time() - began
         pump(QUIET)
         progress = self.reports.progress()
         percents = [r[2] for r in progress]
@@ -85,8 +82,6 @@ class Publishing(UploadTest):
                          (set([MAIN_THREAD]), 1, 0, 100))
         self.assertEqual(percents, sorted(percents))
         self.assertGreater(len(set(percents)), 2)
-        # Besides its first and last, a file reports at most once a half-second.
-        self.assertLessEqual(len(percents), 2 * (14 + int(elapsed) + 2))
         self.assertEqual(set(r[:2] + (type(r[3]),) for r in progress), set([(u'PROGRESS', u'ProgressChanged', int)]))
         self.assertEqual(progress[0][3], preset_size // 5600)  # the initial estimate
         self.assertEqual(self.uploader.GetUploadedFileUrl(), FIRST_URL)
@@ -129,19 +124,14 @@ class Answers(UploadTest):
         files = [self.preset] + self.images
         starts = [self.start(files=files[:index] + [absent] + files[index + 1:])
                   for index in range(5) for absent in (self.missing, None)]
-        longest = u'h' * (259 - len(u'http://') - len(UPLOAD_PATH))
-        starts += [self.start(self.new_uploader(host, *SESSION[1:])) for host in (
-            u'', u'api.orbishare.com:8080', u'me@api.orbishare.com', u'api.orbishare.com?x=1', longest + u'h')]
+        # A host the upload URL cannot carry (the URL rules themselves are the transport's units)
+        starts += [self.start(self.new_uploader(host, *SESSION[1:])) for host in (u'', u'h:8080')]
         worker = threading.Thread(target=lambda: starts.append(self.start(self.new_uploader())))
         worker.start()
         worker.join()
         pump(0.3)
         self.assertEqual((starts, self.reports.items, self.uploads(), self.uploader.GetUploadedFileUrl()),
-                         ([0] * 16, [], [], FIRST_URL))
-        # The longest host that fits the URL starts, and fails to resolve.
-        fitting = self.new_uploader(longest, *SESSION[1:])
-        self.assertEqual(self.start(fitting), 1)
-        self.assertEqual(self.completion()[2:], FAILED)
+                         ([0] * 13, [], [], FIRST_URL))
         for image7 in (self.missing, None):
             self.reports.items = []
             self.assertEqual(self.start(files=files[:7] + [image7] + files[8:]), 1)
@@ -149,25 +139,18 @@ class Answers(UploadTest):
             upload = self.uploads()[-1]
             self.assertEqual((upload.complete, upload.upload.files[-1].name), (False, 'PIPimg_7'))
 
-    def test_a_callable_replaced_between_two_reports_and_one_that_raises(self):
-        later = Reports()
-        self.reports.then = lambda reports, report: self.uploader.SetCallback(later)
-        self.start()
-        self.assertEqual(self.completion(later)[3:], (1, FIRST_URL, u''))
-        self.assertEqual([r[1] for r in self.reports.items], [u'ProgressChanged'])
-
+    def test_a_callable_that_raises_has_each_error_printed_and_still_gets_every_report(self):
         def fail(reports, report):
             raise ZeroDivisionError('report %d' % len(reports.items))
-        raising = Reports(fail)
-        self.assertEqual(self.uploader.SetCallback(raising), 1)
+        self.reports.then = fail
         stderr, sys.stderr = sys.stderr, io.BytesIO() if PY2 else io.StringIO()
         try:
             self.start()
-            self.completion(raising)
+            self.completion()
         finally:
             printed, sys.stderr = sys.stderr.getvalue(), stderr
-        self.assertEqual(raising.completions()[0][3:], (1, SECOND_URL, u''))
-        self.assertEqual(printed.count('ZeroDivisionError: report'), len(raising.items))
+        self.assertEqual(self.reports.completions()[0][3:], (1, FIRST_URL, u''))
+        self.assertEqual(printed.count('ZeroDivisionError: report'), len(self.reports.items))
 
 
 class Stopping(UploadTest):
@@ -176,13 +159,13 @@ class Stopping(UploadTest):
     def setUp(self):
         UploadTest.setUp(self)
         self.replace_files(preset_size=24 * 1024 * 1024)
-        self.slow_reader(1024 * 1024)
+        self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=1024 * 1024)])
 
     def test_a_cancel_while_streaming_completes_at_once_and_reports_no_earlier_success(self):
         self.svc.reset()  # a quick first upload
         self.start()
         self.assertEqual(self.completion()[3], 1)
-        self.slow_reader(1024 * 1024)
+        self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=1024 * 1024)])
         second = Reports()
         self.uploader.SetCallback(second)
         self.assertEqual(self.start(), 1)
@@ -197,34 +180,13 @@ class Stopping(UploadTest):
         self.assertEqual((len(second.items), self.uploader.GetUploadedFileUrl(), upload.complete), (count, u'', False))
         self.assertLess(upload.body_size, 24 * 1024 * 1024)
 
-    def test_deleting_waits_for_the_worker_and_lets_go_of_the_callable_even_from_inside_it(self):
-        threads_before = counts()[0]
-        references_before = sys.getrefcount(self.reports)
-        self.start()
-        self.wait_for_progress()
-        self.assertEqual(counts()[0], threads_before + 1)
-        count = len(self.reports.items)
-        self.uploader = None  # the last reference: the native object goes now
-        self.assertEqual(settled(lambda: counts()[0], threads_before), threads_before)
-        pump(QUIET)
-        self.assertEqual((len(self.reports.items), self.reports.completions()), (count, []))
-        gc.collect()
-        self.assertEqual(sys.getrefcount(self.reports), references_before - 1)
-        self.assertFalse(self.uploads(bodies=False)[0].complete)
-        self.reports = Reports(lambda reports, report: setattr(self, 'uploader', None))
-        self.uploader = self.new_uploader()
-        self.start()
-        wait_until(lambda: self.reports.items, 30.0, 'first report')
-        self.assertEqual(settled(lambda: counts()[0], threads_before), threads_before)
-        pump(QUIET)
-        self.assertEqual(len(self.reports.items), 1)
-
     def test_an_interpreter_exiting_mid_upload_ends_at_once_and_cuts_the_upload_off(self):
         # The uploader in a global (destroyed as the globals are cleared) or in a
         # reference cycle (never collected: its worker still runs when the process ends).
         for in_cycle in (False, True):
             self.svc.reset()
-            self.slow_reader(8 * 1024 * 1024)  # what the socket buffers hold drains soon
+            # read fast, as what the socket buffers hold drains soon
+            self.svc.script(SERVER_HOST, UPLOAD_PATH, [reply(read_rate=8 * 1024 * 1024)])
             started = time.time()
             code, out, err = run_python('''
                 from fixtures import Reports, SESSION, TEXTS, wait_until
