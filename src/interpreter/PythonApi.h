@@ -410,4 +410,20 @@ inline bool TakesPendingCalls() {
 #endif
 }
 
+// PyArg_UnpackTuple, with 2.7's words for a wrong number of arguments on both:
+// 3 says "1 argument" where 2.7 said "1 arguments", and callers know the latter.
+template <typename... Out>
+bool UnpackTuple(PyObject* args, const char* name, Py_ssize_t min, Py_ssize_t max, Out... out) {
+#if PY_MAJOR_VERSION >= 3
+  const Py_ssize_t count = PyTuple_Check(args) ? PyTuple_GET_SIZE(args) : min;
+  if (count < min || count > max) {
+    const char* bound = min == max ? "" : count < min ? "at least " : "at most ";
+    PyErr_Format(PyExc_TypeError, "%s expected %s%zd arguments, got %zd", name, bound,
+                 count < min ? min : max, count);
+    return false;
+  }
+#endif
+  return PyArg_UnpackTuple(args, name, min, max, out...) != 0;
+}
+
 }  // namespace python_api

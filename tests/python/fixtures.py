@@ -74,6 +74,10 @@ class Recorded(object):
         if isinstance(getattr(self, 'upload', None), dict):
             self.upload = Recorded(self.upload)
             self.upload.parts = [Recorded(p) for p in self.upload.parts]
+            for part in self.upload.parts:  # ASCII: the interpreter's own str
+                for key in ('name', 'content_type'):
+                    if not PY2 and isinstance(getattr(part, key, None), bytes):
+                        setattr(part, key, getattr(part, key).decode('latin-1'))
             self.upload.fields = [(p.name, p.content) for p in self.upload.parts if p.kind == 'field']
             self.upload.files = [p for p in self.upload.parts if p.kind == 'file']
 

@@ -10,6 +10,7 @@ import tempfile
 import unittest
 
 BUILD = os.environ['UPLOADER_BUILD_DIR']
+MODULE_FILE = '_PyUploader' + (sysconfig.get_config_var('EXT_SUFFIX') or '.so')  # no suffix var on 2.7
 # Imports the companion from the user site (PYTHONUSERBASE) and names what has no docstring.
 IMPORT_AND_DOCUMENT = """
 import inspect, PyUploader, _PyUploader
@@ -32,12 +33,14 @@ class Install(unittest.TestCase):
                 (['--prefix', root], {}, sysconfig.get_paths(vars={'base': root, 'platbase': root})['platlib'])]:
             subprocess.check_output(['cmake', '--install', BUILD] + options, env=dict(os.environ, **env),
                                     stderr=subprocess.STDOUT)
-            self.assertEqual(sorted(os.listdir(site)), ['PyUploader.py', '_PyUploader.so'])
+            self.assertEqual(sorted(os.listdir(site)), ['PyUploader.py', MODULE_FILE])
         env = dict(os.environ, PYTHONUSERBASE=root)
         env.pop('PYTHONPATH')
+        if sysconfig.get_paths('posix_user', vars={'userbase': root})['platlib'] != site:
+            env['PYTHONPATH'] = site  # Debian's prefix layout (local/.../dist-packages) is no user site
         output = subprocess.check_output([sys.executable, '-c', IMPORT_AND_DOCUMENT], env=env, cwd=root,
                                          stderr=subprocess.STDOUT).decode('utf-8')
-        self.assertEqual(output.splitlines(), [os.path.join(site, 'PyUploader.py'), os.path.join(site, '_PyUploader.so')])
+        self.assertEqual(output.splitlines(), [os.path.join(site, 'PyUploader.py'), os.path.join(site, MODULE_FILE)])
 
 
 if __name__ == '__main__':

@@ -123,7 +123,7 @@ PyObject* Acquire(PyObject* self, PyObject*) {
 
 PyObject* Own(PyObject* self, PyObject* args) {
   PyObject* value = nullptr;
-  if (!PyArg_UnpackTuple(args, "own", 0, 1, &value)) return nullptr;
+  if (!python_api::UnpackTuple(args, "own", 0, 1, &value)) return nullptr;
   PyObject* previous = PyBool_FromLong(AsObject(self)->own);
   if (value) {
     int truth = PyObject_IsTrue(value);
