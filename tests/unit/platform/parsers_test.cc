@@ -16,13 +16,7 @@ using namespace std::literals;
 using Outcome = platform::xml::Lookup::Outcome;
 
 TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
-  struct Case {
-    std::wstring text;
-    const char* path;
-    Outcome outcome;
-    std::wstring found;
-  };
-  const Case cases[] = {
+  const std::tuple<std::wstring, const char*, Outcome, std::wstring> cases[] = {
       {L"<info><a>1</a><a>2</a></info>", "info/a", Outcome::kFound, L"1"},
       {L"<INFO><a>1</a></INFO>", "info/a", Outcome::kAbsent, L""},  // case-sensitive
       {L"<a><b/><b><c>x</c></b></a>", "a/b/c", Outcome::kFound, L"x"},  // first in document order
@@ -36,9 +30,9 @@ TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
       {L"<a>x</a>", "", Outcome::kFailed, L""},
       {L"<a><b>x</b></a>", "a//b", Outcome::kFailed, L""},
   };
-  for (const Case& c : cases) {
-    const platform::xml::Lookup lookup = platform::xml::Document(c.text).NodeText(c.path);
-    EXPECT_EQ((std::pair{lookup.outcome, lookup.text}), (std::pair{c.outcome, c.found})) << c.path;
+  for (const auto& [text, path, outcome, found] : cases) {
+    const platform::xml::Lookup lookup = platform::xml::Document(text).NodeText(path);
+    EXPECT_EQ((std::pair{lookup.outcome, lookup.text}), (std::pair{outcome, found})) << path;
   }
   platform::xml::Document first(std::string("<a>x</a>"));  // short enough to live in a string object
   const platform::xml::Document moved(std::move(first));

@@ -111,21 +111,16 @@ TEST(CallSequence, CopiesMadeBeforeARefusalOrAnExceptionAreFreed) {
 TEST(ResultKinds, WideTextsBecomeUnicodeWithEveryCharacter) {
   const std::wstring text(L"m\u00E4\0t\U0001F600", 5);
   const auto same = [&](PyObject* object) {
-    return object && PyUnicode_CheckExact(object) &&
-           [object] {
-             std::wstring chars(python_api::UnicodeLength(object), L'\0');
-             python_api::CopyUnicode(object, chars.data(), chars.size());
-             return chars;
-           }() == text;
+    if (!object || !PyUnicode_CheckExact(object)) return false;
+    std::wstring chars(python_api::UnicodeLength(object), L'\0');
+    python_api::CopyUnicode(object, chars.data(), chars.size());
+    return chars == text;
   };
-  EXPECT_TRUE(same(PyRef(ReturnsUnicode{}.Make(text)).get()));
-  EXPECT_TRUE(same(PyRef(ReturnsUnicodeOrNone{}.Make(text)).get()));
-  EXPECT_EQ(PyRef(ReturnsUnicodeOrNone{}.Make(std::nullopt)).get(), Py_None);
-  PyRef dictionary(ReturnsUnicodeDict{}.Make({{L"7", text}, {text, L""}}));
+  EXPECT_TRUE(same(PyRef(FromWide(text)).get()));
+  PyRef dictionary(FromWideMap({{L"7", text}, {text, L""}}));
   ASSERT_TRUE(dictionary && PyDict_CheckExact(dictionary.get()));
   EXPECT_EQ(PyDict_Size(dictionary.get()), 2);
-  PyRef key(FromWide(L"7"));
-  EXPECT_TRUE(same(PyDict_GetItem(dictionary.get(), key.get())));
+  EXPECT_TRUE(same(PyDict_GetItem(dictionary.get(), PyRef(FromWide(L"7")).get())));
 }
 
 }  // namespace
