@@ -31,26 +31,19 @@ std::string ReadFile(const std::filesystem::path& path) {
 }
 
 // A hive file holding the trace switch, and the trace lines captured in a file.
-class TraceCapture {
- public:
-  TraceCapture()
-      : folder_(std::filesystem::temp_directory_path() / ("trace_" + std::to_string(::getpid()))),
-        hiveEnv_(platform::kHivePathVariable, (folder_ / "hive.reg").string()),
-        outputEnv_(platform::kDebugOutputPathVariable, (folder_ / "out.log").string()) {
-    std::filesystem::create_directories(folder_);
+class Trace : public TempFolderTest {
+ protected:
+  void SetUp() override {
+    TempFolderTest::SetUp();
+    hive_.emplace(platform::kHivePathVariable, (folder_ / "hive.reg").string());
+    output_.emplace(platform::kDebugOutputPathVariable, (folder_ / "out.log").string());
     SetSwitch(1);
   }
-  ~TraceCapture() { std::filesystem::remove_all(folder_); }
-  void SetSwitch(int dumpMsg) const {
-    std::ofstream(folder_ / "hive.reg") << "REGEDIT4\r\n\r\n[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\"
-                                           "Lumivanta]\r\n\"DumpMsg\"=dword:" << dumpMsg << "\r\n";
+  static void SetSwitch(int dumpMsg) {
+    std::ofstream("hive.reg") << "REGEDIT4\r\n\r\n[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\"
+                                 "Lumivanta]\r\n\"DumpMsg\"=dword:" << dumpMsg << "\r\n";
   }
-  void RemoveHive() const { std::filesystem::remove(folder_ / "hive.reg"); }
-  std::string Bytes() const { return ReadFile(folder_ / "out.log"); }
-
- private:
-  std::filesystem::path folder_;
-  ScopedEnv hiveEnv_, outputEnv_;
+  std::optional<ScopedEnv> hive_, output_;
 };
 
 // The mapping is trimmed to an aligned range: a wrong trim would leave part of
@@ -134,8 +127,7 @@ TEST_F(Links, OnlyWebLinksGoToXdgOpenWhichIsReapedAndNoHandlerIsAFailure) {
 }
 
 // Lines from many threads stay whole; each is appended in UTF-8.
-TEST(DebugOutput, LinesStayWholeFromManyThreads) {
-  TraceCapture capture;
+TEST_F(Trace, DebugOutputLinesStayWholeFromManyThreads) {
   std::vector<std::thread> writers;
   for (int t = 0; t < 4; ++t) {
     writers.emplace_back([t] {
@@ -147,7 +139,7 @@ TEST(DebugOutput, LinesStayWholeFromManyThreads) {
   for (auto& w : writers) w.join();
   std::string utf8;
   for (int i = 0; i < 300; ++i) utf8 += "\xC3\xA4";
-  std::istringstream lines(capture.Bytes());
+  std::istringstream lines(ReadFile("out.log"));
   std::set<std::string> seen;
   for (std::string line; std::getline(lines, line); seen.insert(line)) {
     ASSERT_EQ(line.substr(line.size() - 600), utf8);
@@ -155,13 +147,12 @@ TEST(DebugOutput, LinesStayWholeFromManyThreads) {
   EXPECT_EQ(seen.size(), 800u);
 }
 
-TEST(Trace, AMissingHiveKeepsTheStateAndLongNamesKeepThePrefix) {
-  TraceCapture capture;
+TEST_F(Trace, AMissingHiveKeepsTheStateAndLongNamesKeepThePrefix) {
   diag::TraceSetPrefix("First");
-  capture.RemoveHive();
+  std::filesystem::remove("hive.reg");
   diag::TraceSetPrefix("Second");
   diag::TraceMessage(L"still on");
-  capture.SetSwitch(1);
+  SetSwitch(1);
   // With its brackets, a name of 29 characters is cut to 29; a longer one is not taken.
   for (const char* name : {"", static_cast<const char*>(nullptr), "ABCDEFGHIJKLMNOPQRSTUVWXYZ012",
                            "ABCDEFGHIJKLMNOPQRSTUVWXYZ0123"}) {
@@ -169,12 +160,12 @@ TEST(Trace, AMissingHiveKeepsTheStateAndLongNamesKeepThePrefix) {
     diag::TraceMessage(L"x");
   }
   diag::TraceMessage(L"KRV version = %s; host %S; %d%%", L"5.0 \u00E4", "n\xC3\xA4", 7);
-  capture.SetSwitch(0);
+  SetSwitch(0);
   diag::TraceSetPrefix("Third");
-  capture.RemoveHive();
+  std::filesystem::remove("hive.reg");
   diag::TraceSetPrefix("Fourth");
   diag::TraceMessage(L"still off");
-  EXPECT_EQ(capture.Bytes(), "[First]still on\n[]x\n[]x\n[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
+  EXPECT_EQ(ReadFile("out.log"), "[First]still on\n[]x\n[]x\n[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
                              "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
                              "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01KRV version = 5.0 \xC3\xA4; host n\xC3\xA4; 7%\n");
 }
