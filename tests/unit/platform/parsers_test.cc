@@ -3,14 +3,12 @@
 #include <gtest/gtest.h>
 
 #include <cstdarg>
-#include <fstream>
 
 #include "platform/ascii.h"
 #include "platform/registry.h"
 #include "platform/text.h"
 #include "platform/wide_format.h"
 #include "platform/xml.h"
-#include "fixtures.h"
 
 namespace {
 
@@ -18,13 +16,7 @@ using namespace std::literals;
 using Outcome = platform::xml::Lookup::Outcome;
 
 TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
-  struct Case {
-    std::wstring text;
-    const char* path;
-    Outcome outcome;
-    std::wstring found;
-  };
-  const Case cases[] = {
+  const std::tuple<std::wstring, const char*, Outcome, std::wstring> cases[] = {
       {L"<info><a>1</a><a>2</a></info>", "info/a", Outcome::kFound, L"1"},
       {L"<INFO><a>1</a></INFO>", "info/a", Outcome::kAbsent, L""},  // case-sensitive
       {L"<a><b/><b><c>x</c></b></a>", "a/b/c", Outcome::kFound, L"x"},  // first in document order
@@ -38,22 +30,21 @@ TEST(Xml, APathFindsTheFirstMatchingNodeAndTheTextOfItAndItsDescendants) {
       {L"<a>x</a>", "", Outcome::kFailed, L""},
       {L"<a><b>x</b></a>", "a//b", Outcome::kFailed, L""},
   };
-  for (const Case& c : cases) {
-    const platform::xml::Lookup lookup = platform::xml::Document(c.text).NodeText(c.path);
-    EXPECT_EQ((std::pair{lookup.outcome, lookup.text}), (std::pair{c.outcome, c.found})) << c.path;
+  for (const auto& [text, path, outcome, found] : cases) {
+    const platform::xml::Lookup lookup = platform::xml::Document(text).NodeText(path);
+    EXPECT_EQ((std::pair{lookup.outcome, lookup.text}), (std::pair{outcome, found})) << path;
   }
-  EXPECT_TRUE(platform::xml::Document().empty());
-  platform::xml::Document first(std::string("<a>x</a>"));  // short enough to live inside a string object
+  platform::xml::Document first(std::string("<a>x</a>"));  // short enough to live in a string object
   const platform::xml::Document moved(std::move(first));
   first = platform::xml::Document(std::string("<b>y</b>"));  // takes the first one's place
   EXPECT_EQ(moved.NodeText("a").text, L"x") << "a moved document reads its own text";
   // A node record takes 64 bytes: a quarter of the bound's count is read, the whole count is not.
-  auto elements = [](std::size_t count) {
+  for (const auto& [count, read] : {std::pair{platform::xml::kMaxTreeBytes / 256, true},
+                                    std::pair{platform::xml::kMaxTreeBytes / 64, false}}) {
     std::string text = "<a>";
     for (std::size_t i = 0; i < count; ++i) text += "<b/>";
-    return platform::xml::Document(text + "</a>").empty();
-  };
-  EXPECT_EQ((std::pair{elements(platform::xml::kMaxTreeBytes / 256), elements(platform::xml::kMaxTreeBytes / 64)}), (std::pair{false, true}));
+    EXPECT_EQ(platform::xml::Document(text + "</a>").empty(), !read) << count;
+  }
   EXPECT_TRUE(platform::xml::Document(L"<a><b></a>").Top().Children().empty());
 }
 
@@ -97,21 +88,6 @@ TEST(RegistryHive, TheSwitchIsReadAsAThirtyTwoBitNumberInEveryFormTheEditorWrite
   }
 }
 
-TEST(RegistryHive, IsTheFileNamedByTheEnvironmentElseTheDefaultPath) {
-  {
-    test_support::ScopedEnv unset(platform::kHivePathVariable, std::nullopt);
-    EXPECT_EQ(platform::HivePath(), platform::kDefaultHivePath);
-  }
-  const std::string path = std::filesystem::temp_directory_path() / ("hive_" + std::to_string(::getpid()));
-  test_support::ScopedEnv env(platform::kHivePathVariable, path);
-  EXPECT_FALSE(platform::RegistryKey::OpenLocalMachine(kSubkey).has_value()) << "no file yet";
-  std::ofstream(path) << kHeader + kSection + "\"DumpMsg\"=dword:00000005\n";
-  const auto key = platform::RegistryKey::OpenLocalMachine(kSubkey);
-  std::filesystem::remove(path);
-  ASSERT_TRUE(key.has_value());
-  EXPECT_EQ(key->ReadNumber(L"DumpMsg"), 5u);
-}
-
 TEST(Utf8, DecodesOrReplacesEachSequenceAndEncodesEveryPlane) {
   for (const auto& [bytes, wide] : std::vector<std::pair<std::string, std::wstring>>{
            {"a\xC3\xA4\xE4\xB8\xAD\xF0\x9F\x98\x80", L"a\u00E4\u4E2D\U0001F600"}, {"a\0b"s, L"a\0b"s}}) {
@@ -127,14 +103,20 @@ TEST(Utf8, DecodesOrReplacesEachSequenceAndEncodesEveryPlane) {
 TEST(Ascii, FoldsTheCaseOfAsciiLettersOnlyAndTrimsBlanksOnly) {
   for (const auto& [a, b, same] : std::vector<std::tuple<std::string, std::string, bool>>{
            {"Content-TYPE", "content-type", true}, {"", "", true}, {"a\0B"s, "A\0b"s, true},
-           {"a\0x"s, "a\0y"s, false}, {"ab", "abc", false}, {"[", "{", false}, {"\xC4", "\xE4", false}})
+           {"a\0x"s, "a\0y"s, false}, {"ab", "abc", false}, {"[", "{", false}, {"\xC4", "\xE4", false}}) {
     EXPECT_EQ(platform::EqualIgnoringCase(a, b), same) << a;
-  EXPECT_EQ((std::tuple{platform::Lowered(L"\u00C4BZ[@"), platform::Trim(" \t\r\na b\n"), platform::Trim(L"\v x\u00A0 ")}),
-            (std::tuple{L"\u00C4bz[@"s, "a b"sv, L"\v x\u00A0"sv}));
-  EXPECT_EQ((std::pair{platform::UpToNul("ab\0c"sv), platform::UpToNul(L"abc"sv)}), (std::pair{"ab"sv, L"abc"sv}));
-  std::wstring seen;  // per character: its value as a hex digit or "-", then "+" for a letter or digit
-  for (const wchar_t c : L"09afAF/:@G`gZ{\u00E4"sv)
-    seen += {platform::HexDigitValue(c) ? L"0123456789abcdef"[*platform::HexDigitValue(c)] : L'-', platform::IsLetterOrDigit(c) ? L'+' : L'-'};
+  }
+  EXPECT_EQ(platform::Lowered(L"\u00C4BZ[@"), L"\u00C4bz[@");
+  EXPECT_EQ(platform::Trim(" \t\r\na b\n"), "a b");
+  EXPECT_EQ(platform::Trim(L"\v x\u00A0 "), L"\v x\u00A0");
+  EXPECT_EQ(platform::UpToNul("ab\0c"sv), "ab"sv);
+  EXPECT_EQ(platform::UpToNul(L"abc"sv), L"abc"sv);
+  // Per character: its value as a hex digit or "-", then "+" for a letter or digit.
+  std::wstring seen;
+  for (const wchar_t c : L"09afAF/:@G`gZ{\u00E4"sv) {
+    const auto hex = platform::HexDigitValue(c);
+    seen += {hex ? L"0123456789abcdef"[*hex] : L'-', platform::IsLetterOrDigit(c) ? L'+' : L'-'};
+  }
   EXPECT_EQ(seen, L"0+9+a+f+a+f+-------+---+-+----");
 }
 
@@ -153,7 +135,8 @@ TEST(WideFormat, KeepsTheWindowsMeaningOfTextConversionsAndCutsWhatDoesNotFit) {
             L"%ls|%s|%lc%c|%s|%ls|%ls|%-10ls|%*.*s|%%s %d %5.2f %lu %p|%-5");
   EXPECT_EQ(Format(64, L"%s|%S|%c|%C|%d", L"w\u00E4\U0001F600", "n\xC3\xA4", L'\u4E2D', 'x', -7),
             L"w\u00E4\U0001F600|n\u00E4|\u4E2D|x|-7");
-  EXPECT_EQ((std::vector{Format(6, L"%s", L"abcdefghij"), Format(6, L"abc%S", "defghij"), Format(1, L"ab")}),
+  EXPECT_EQ((std::vector{Format(6, L"%s", L"abcdefghij"), Format(6, L"abc%S", "defghij"),
+                         Format(1, L"ab")}),
             (std::vector<std::wstring>{L"abcde", L"abcde", L""}));
 }
 

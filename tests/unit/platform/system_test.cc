@@ -1,8 +1,9 @@
-// The stand-ins for the operating system's services: the large buffer, links handed to a browser, the debug output and
-// the debug trace with its process-wide switch and prefix.
-#include <dirent.h>
+// The stand-ins for the operating system's services: the large buffer, links
+// handed to a browser, the debug output and the debug trace with its
+// process-wide switch and prefix.
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 
 #include <algorithm>
 #include <cstring>
@@ -29,26 +30,20 @@ std::string ReadFile(const std::filesystem::path& path) {
   return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
 }
 
-// A hive file holding the trace switch, and the trace lines captured in a
-// file; make it before the object under test, which reads the switch.
-class TraceCapture {
- public:
-  TraceCapture()
-      : folder_(std::filesystem::temp_directory_path() / ("trace_" + std::to_string(::getpid()))),
-        hiveEnv_(platform::kHivePathVariable, (folder_ / "hive.reg").string()),
-        outputEnv_(platform::kDebugOutputPathVariable, (folder_ / "out.log").string()) {
-    std::filesystem::create_directories(folder_);
+// A hive file holding the trace switch, and the trace lines captured in a file.
+class Trace : public TempFolderTest {
+ protected:
+  void SetUp() override {
+    TempFolderTest::SetUp();
+    hive_.emplace(platform::kHivePathVariable, (folder_ / "hive.reg").string());
+    output_.emplace(platform::kDebugOutputPathVariable, (folder_ / "out.log").string());
     SetSwitch(1);
   }
-  ~TraceCapture() { std::filesystem::remove_all(folder_); }
-  void SetSwitch(int dumpMsg) const { Hive("[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\Lumivanta]\r\n\"DumpMsg\"=dword:" + std::to_string(dumpMsg)); }
-  void RemoveKey() const { Hive(""); }  // the key cannot be opened
-  std::string Bytes() const { return ReadFile(folder_ / "out.log"); }
-
- private:
-  void Hive(const std::string& key) const { std::ofstream(folder_ / "hive.reg") << "REGEDIT4\r\n\r\n" << key << "\r\n"; }
-  std::filesystem::path folder_;
-  ScopedEnv hiveEnv_, outputEnv_;
+  static void SetSwitch(int dumpMsg) {
+    std::ofstream("hive.reg") << "REGEDIT4\r\n\r\n[HKEY_LOCAL_MACHINE\\SOFTWARE\\Quillmark\\"
+                                 "Lumivanta]\r\n\"DumpMsg\"=dword:" << dumpMsg << "\r\n";
+  }
+  std::optional<ScopedEnv> hive_, output_;
 };
 
 // The mapping is trimmed to an aligned range: a wrong trim would leave part of
@@ -93,42 +88,19 @@ class Links : public TempFolderTest {
   ScopedEnv browser_{"BROWSER", std::nullopt};
 };
 
-std::string Substitute(std::string text, const std::string& from, const std::string& to) {
-  for (std::size_t at = text.find(from); at != std::string::npos; at = text.find(from, at + to.size())) {
-    text.replace(at, from.size(), to);
-  }
-  return text;
-}
-
 TEST_F(Links, TheFirstBrowserCommandThatRunsGetsTheLinkAndNoShellReadsIt) {
   const std::string recorder = Recorder("recorder");
   const std::string link = "http://www.orbishare.com/first?a=1&b=%41 'x' $(touch y);z";
   for (const auto& [browser, expected] : std::vector<std::pair<std::string, Argv>>{
-           {"R", {"L"}}, {"recorder --new-tab", {"--new-tab", "L"}}, {"R --url=%s -x", {"--url=L", "-x"}},
-           {"R 100%% %s", {"100%", "L"}}, {"no-such-browser %s::R", {"L"}}}) {
+           {recorder, {link}}, {"recorder --new-tab", {"--new-tab", link}},
+           {"recorder --url=%s -x", {"--url=" + link, "-x"}}, {"recorder 100%% %s", {"100%", link}},
+           {"no-such-browser %s::recorder", {link}}}) {
     std::filesystem::remove(recorder + ".out");
-    ScopedEnv env("BROWSER", Substitute(browser, "R", recorder));
+    ScopedEnv env("BROWSER", browser);
     ASSERT_TRUE(platform::OpenLink(std::wstring(link.begin(), link.end())));
-    Argv wanted;
-    for (const std::string& arg : expected) wanted.push_back(Substitute(arg, "L", link));
-    EXPECT_EQ(RecordedArgs(recorder), wanted) << browser;
+    EXPECT_EQ(RecordedArgs(recorder), expected) << browser;
   }
   EXPECT_FALSE(std::filesystem::exists("y")) << "a shell read the link";
-}
-
-int ChildProcesses() {
-  int children = 0;
-  for (const auto& entry : std::filesystem::directory_iterator("/proc")) {
-    std::string line;
-    std::getline(std::ifstream(entry.path() / "stat"), line);
-    if (line.empty()) continue;
-    std::istringstream fields(line.substr(line.rfind(')') + 2));
-    char state = 0;
-    int parent = 0;
-    fields >> state >> parent;
-    children += parent == ::getpid();
-  }
-  return children;
 }
 
 TEST_F(Links, OnlyWebLinksGoToXdgOpenWhichIsReapedAndNoHandlerIsAFailure) {
@@ -140,52 +112,60 @@ TEST_F(Links, OnlyWebLinksGoToXdgOpenWhichIsReapedAndNoHandlerIsAFailure) {
   EXPECT_FALSE(std::filesystem::exists(opener + ".out"));
   ASSERT_TRUE(platform::OpenLink(L"HTTPS://www.orbishare.com/\u00E4"));
   EXPECT_EQ(RecordedArgs(opener), Argv{"HTTPS://www.orbishare.com/\xC3\xA4"});
+  // Until no child is left, running or ended but not reaped.
   const auto deadline = std::chrono::steady_clock::now() + kPatience;
-  while (ChildProcesses() > 0 && std::chrono::steady_clock::now() < deadline) {
+  siginfo_t child{};
+  int children;
+  while ((children = ::waitid(P_ALL, 0, &child, WEXITED | WNOHANG | WNOWAIT)) == 0 &&
+         std::chrono::steady_clock::now() < deadline) {
     std::this_thread::sleep_for(std::chrono::milliseconds(10));
   }
-  EXPECT_EQ(ChildProcesses(), 0) << "a zombie is left";
+  EXPECT_EQ(children, -1) << "a zombie is left";
   std::filesystem::remove(opener);
   ScopedEnv none("BROWSER", std::string("no-such-browser:also-missing %s"));
   EXPECT_FALSE(platform::OpenLink(L"http://www.orbishare.com/"));
 }
 
 // Lines from many threads stay whole; each is appended in UTF-8.
-TEST(DebugOutput, LinesStayWholeFromManyThreads) {
-  TraceCapture capture;
+TEST_F(Trace, DebugOutputLinesStayWholeFromManyThreads) {
   std::vector<std::thread> writers;
   for (int t = 0; t < 4; ++t) {
     writers.emplace_back([t] {
-      for (int i = 0; i < 200; ++i) platform::WriteDebugOutput(std::to_wstring(t * 1000 + i) + std::wstring(300, L'\u00E4') + L"\n");
+      for (int i = 0; i < 200; ++i) {
+        platform::WriteDebugOutput(std::to_wstring(t * 1000 + i) + std::wstring(300, L'\u00E4') + L"\n");
+      }
     });
   }
   for (auto& w : writers) w.join();
-  std::istringstream lines(capture.Bytes());
-  std::set<std::string> seen;
   std::string utf8;
   for (int i = 0; i < 300; ++i) utf8 += "\xC3\xA4";
-  for (std::string line; std::getline(lines, line); seen.insert(line)) ASSERT_EQ(line.substr(line.size() - 600), utf8);
+  std::istringstream lines(ReadFile("out.log"));
+  std::set<std::string> seen;
+  for (std::string line; std::getline(lines, line); seen.insert(line)) {
+    ASSERT_EQ(line.substr(line.size() - 600), utf8);
+  }
   EXPECT_EQ(seen.size(), 800u);
 }
 
-TEST(Trace, AnUnopenableKeyKeepsTheStateAndLongNamesKeepThePrefix) {
-  TraceCapture capture;
+TEST_F(Trace, AMissingHiveKeepsTheStateAndLongNamesKeepThePrefix) {
   diag::TraceSetPrefix("First");
-  capture.RemoveKey();
+  std::filesystem::remove("hive.reg");
   diag::TraceSetPrefix("Second");
   diag::TraceMessage(L"still on");
-  capture.SetSwitch(1);
-  for (const char* name : std::vector<const char*>{"", nullptr, "ABCDEFGHIJKLMNOPQRSTUVWXYZ012", "ABCDEFGHIJKLMNOPQRSTUVWXYZ0123"}) {
+  SetSwitch(1);
+  // With its brackets, a name of 29 characters is cut to 29; a longer one is not taken.
+  for (const char* name : {"", static_cast<const char*>(nullptr), "ABCDEFGHIJKLMNOPQRSTUVWXYZ012",
+                           "ABCDEFGHIJKLMNOPQRSTUVWXYZ0123"}) {
     diag::TraceSetPrefix(name);
     diag::TraceMessage(L"x");
   }
   diag::TraceMessage(L"KRV version = %s; host %S; %d%%", L"5.0 \u00E4", "n\xC3\xA4", 7);
-  capture.SetSwitch(0);
+  SetSwitch(0);
   diag::TraceSetPrefix("Third");
-  capture.RemoveKey();
+  std::filesystem::remove("hive.reg");
   diag::TraceSetPrefix("Fourth");
   diag::TraceMessage(L"still off");
-  EXPECT_EQ(capture.Bytes(), "[First]still on\n[]x\n[]x\n[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
+  EXPECT_EQ(ReadFile("out.log"), "[First]still on\n[]x\n[]x\n[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
                              "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01x\n"
                              "[ABCDEFGHIJKLMNOPQRSTUVWXYZ01KRV version = 5.0 \xC3\xA4; host n\xC3\xA4; 7%\n");
 }
