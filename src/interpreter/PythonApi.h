@@ -399,6 +399,11 @@ inline bool ThisThreadHoldsLock() {
 #endif
 }
 
+// Python 3.9 to 3.11, where a pending call added by a thread other than the main
+// one is noticed only when the main thread next takes the lock (MainThreadNudge.h).
+#define PYUPLOADER_PENDING_CALLS_NEED_NUDGE \
+  (PY_VERSION_HEX >= 0x03090000 && PY_VERSION_HEX < 0x030C0000)
+
 // False once the interpreter has begun to finalize on 3, where a pending call added
 // from then on may reach a freed interpreter; 2.7 takes them to the end (they are
 // run, if ever, by the main thread).

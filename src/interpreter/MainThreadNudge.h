@@ -1,0 +1,20 @@
+#pragma once
+
+namespace interpreter {
+
+// Python 3.9 to 3.11 decide whether the main thread must stop for pending calls
+// on the thread that adds one, and a thread other than the main one never may:
+// the main thread notices the call only when it next takes the interpreter lock,
+// which a loop in pure Python never does. There a helper thread asks for the
+// lock briefly after each such registration: a waiter makes the holder let go
+// after the switch interval, and the main thread, retaking the lock, sees the
+// pending call. Other interpreters notice at once; there both do nothing.
+
+// Starts the helper, once. On the interpreter's main thread, before it finalizes.
+void PrepareMainThreadNudge();
+
+// Has the helper ask for the lock soon when the calling thread is not the main
+// one; requests coalesce. Never blocks; does nothing before the preparation.
+void NudgeMainThread();
+
+}  // namespace interpreter
