@@ -415,4 +415,15 @@ inline bool TakesPendingCalls() {
 #endif
 }
 
+// True while Python 3 exits and tears its modules down: it frees the modules that
+// only sys.modules holds before it clears the globals of the others, so what those
+// globals hold dies after them. 2.7 clears __main__ first and is never asked.
+inline bool TearingDownModules() {
+#if PY_MAJOR_VERSION >= 3
+  return !Py_IsInitialized();
+#else
+  return false;
+#endif
+}
+
 }  // namespace python_api

@@ -23,7 +23,11 @@ TypeTable* g_moduleTable = nullptr;  // this module's own table
 TypeTable* g_ringHead = nullptr;     // the remembered answer of the ring lookup
 
 // Run when the interpreter destroys the ring module: the head table's classes go.
+// Not while the interpreter exits, which frees this module before the objects that
+// other modules' globals hold, and those need their classes' destructors; the
+// classes are then held until the process ends.
 void ReleaseRing(void* pointer) {
+  if (python_api::TearingDownModules()) return;
   auto* head = static_cast<TypeTable*>(pointer);
   for (size_t i = 0; i < head->size; ++i) {
     TypeInfo* type = head->types[i];
