@@ -4,9 +4,9 @@
 
 #include <atomic>
 #include <condition_variable>
+#include <exception>
 #include <mutex>
 #include <new>
-#include <system_error>
 #include <thread>
 
 #include "interpreter/ParkIfStopped.h"
@@ -67,7 +67,7 @@ void PrepareMainThreadNudge() {
   if (!nudger) return;  // tried again by the next preparation
   try {
     std::thread(Serve, std::ref(*nudger)).detach();
-  } catch (const std::system_error&) {
+  } catch (const std::exception&) {  // no thread or no memory for one
     delete nudger;
     return;
   }
