@@ -3,12 +3,12 @@
 namespace interpreter {
 
 // Python 3.9 to 3.11 decide whether the main thread must stop for pending calls
-// on the thread that adds one, and a thread other than the main one never may:
-// the main thread notices the call only when it next takes the interpreter lock,
-// which a loop in pure Python never does. There a helper thread asks for the
-// lock briefly after each such registration: a waiter makes the holder let go
-// after the switch interval, and the main thread, retaking the lock, sees the
-// pending call. Other interpreters notice at once; there both do nothing.
+// on the thread that tries to add one, refused or not, and decide no for a thread
+// other than the main one: the main thread then notices a call only when it next
+// takes the interpreter lock, which a loop in pure Python never does. There a
+// helper thread asks for the lock briefly after each such attempt: a waiter makes
+// the holder let go after the switch interval, and the main thread, retaking the
+// lock, decides again. Other interpreters notice at once; there both do nothing.
 
 // Starts the helper, once. On the interpreter's main thread, before it finalizes.
 void PrepareMainThreadNudge();
