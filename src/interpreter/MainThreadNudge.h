@@ -10,7 +10,8 @@ namespace interpreter {
 // the holder let go after the switch interval, and the main thread, retaking the
 // lock, decides again. Other interpreters notice at once; there both do nothing.
 
-// Starts the helper, once. On the interpreter's main thread, before it finalizes.
+// Starts the helper, once. With the interpreter lock on its main thread (a nudge
+// from the thread taken for the main one is left out), before it finalizes.
 void PrepareMainThreadNudge();
 
 // Has the helper ask for the lock soon when the calling thread is not the main
