@@ -100,8 +100,8 @@ PyMethodDef kHandoverMethods[] = {
 class Interpreter {
  public:
   Interpreter() {
-    python_api::StartHostedInterpreter();
-    PyObject* handover = python_api::CreateModule("handover", kHandoverMethods, PYTHON_API_VERSION);
+    interpreter::StartHostedInterpreter();
+    PyObject* handover = interpreter::CreateModule("handover", kHandoverMethods, PYTHON_API_VERSION);
     PyDict_SetItemString(PyImport_GetModuleDict(), "handover", handover);
     PyRun_SimpleString(kPythonSetUp);
   }
@@ -114,7 +114,7 @@ class Interpreter {
     return PyDict_GetItemString(PyModule_GetDict(PyImport_AddModule("__main__")), name);
   }
   static long Delivered() { return PyLong_AsLong(PyList_GetItem(Global("reports"), 0)); }
-  static void ResetDelivered() { PyList_SetItem(Global("reports"), 0, python_api::NewInt(0)); }
+  static void ResetDelivered() { PyList_SetItem(Global("reports"), 0, interpreter::NewInt(0)); }
 };
 
 // One progress report of a file that streams, as the engine raises it.

@@ -4,6 +4,6 @@
 
 namespace interpreter {
 
-bool InterpreterLockHeld() { return python_api::ThisThreadHoldsLock(); }
+bool InterpreterLockHeld() { return interpreter::ThisThreadHoldsLock(); }
 
 }  // namespace interpreter

@@ -5,6 +5,8 @@
 #include <chrono>
 #include <thread>
 
+namespace interpreter {
+
 // Runs `takeLock`, a call that takes the interpreter lock. Once the interpreter
 // has begun to finalize, Python 3 stops any other thread that takes the lock with
 // pthread_exit, whose unwinding would end the whole process where it crosses a
@@ -18,3 +20,5 @@ void ParkIfStopped(const TakeLock& takeLock) {
     for (;;) std::this_thread::sleep_for(std::chrono::hours(1));
   }
 }
+
+}  // namespace interpreter

@@ -13,7 +13,7 @@
 
 static_assert(sizeof(wchar_t) == 4, "wide strings hold one character per wchar_t");
 
-namespace python_api {
+namespace interpreter {
 
 // ---- The module's entry point and module objects.
 
@@ -399,6 +399,11 @@ inline bool ThisThreadHoldsLock() {
 #endif
 }
 
+// Python 3.9 to 3.11, where a pending call added by a thread other than the main
+// one is noticed only when the main thread next takes the lock (MainThreadNudge.h).
+#define PYUPLOADER_PENDING_CALLS_NEED_NUDGE \
+  (PY_VERSION_HEX >= 0x03090000 && PY_VERSION_HEX < 0x030C0000)
+
 // False once the interpreter has begun to finalize on 3, where a pending call added
 // from then on may reach a freed interpreter; 2.7 takes them to the end (they are
 // run, if ever, by the main thread).
@@ -426,4 +431,15 @@ bool UnpackTuple(PyObject* args, const char* name, Py_ssize_t min, Py_ssize_t ma
   return PyArg_UnpackTuple(args, name, min, max, out...) != 0;
 }
 
-}  // namespace python_api
+// True while Python 3 exits and tears its modules down: it frees the modules that
+// only sys.modules holds before it clears the globals of the others, so what those
+// globals hold dies after them. 2.7 clears __main__ first and is never asked.
+inline bool TearingDownModules() {
+#if PY_MAJOR_VERSION >= 3
+  return !Py_IsInitialized();
+#else
+  return false;
+#endif
+}
+
+}  // namespace interpreter

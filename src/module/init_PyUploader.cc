@@ -3,6 +3,7 @@
 #include <Python.h>
 
 #include "interpreter/AllowThreadsGuard.h"
+#include "interpreter/MainThreadNudge.h"
 #include "interpreter/PythonApi.h"
 #include "module/function_table.h"
 #include "module/runtime/TypeTable.h"
@@ -18,21 +19,23 @@ constexpr int kApiVersion = 1013;
 
 PyObject* MakeModule() {
   // What loading the library sets up: the HTTP library, the interpreter lock for
-  // the worker and probe threads, and its release during the lower layers'
-  // blocking waits.
+  // the worker and probe threads, its release during the lower layers' blocking
+  // waits, and on Python 3.9 to 3.11 the helper thread of the reports' hand-over
+  // (started here, so that the process's threads stay as many as at import).
   platform::http::GlobalInit();
-  python_api::PrepareThreads();
+  interpreter::PrepareThreads();
+  interpreter::PrepareMainThreadNudge();
   platform::InstallBlockingRelease(
       {&interpreter::AllowThreadsGuard::ReleaseInterpreterLock, &interpreter::AllowThreadsGuard::RetakeInterpreterLock});
 
-  PyObject* module = python_api::CreateModule(kModuleName, module::FunctionTable(), kApiVersion);
+  PyObject* module = interpreter::CreateModule(kModuleName, module::FunctionTable(), kApiVersion);
   if (!module) return nullptr;  // the module defines no constants
   // A failure raised here makes the import fail.
   const int failed = runtime::RaiseOnException(1, [] {
     runtime::InitializeTypeTable(module::ModuleTypeTable());
     return 0;
   });
-  return failed ? python_api::AbandonModule(module) : module;
+  return failed ? interpreter::AbandonModule(module) : module;
 }
 
 }  // namespace

@@ -5,6 +5,7 @@
 #include <chrono>
 #include <thread>
 
+#include "interpreter/MainThreadNudge.h"
 #include "interpreter/PythonApi.h"
 #include "platform/message_queue.h"
 
@@ -23,15 +24,22 @@ int DrainMainThreadQueue(void*) {
 }
 
 // An interpreter that has gone away runs nothing more: the queue stays undrained.
+// Every attempt, taken or refused, may leave the main thread not looking at its
+// pending calls, so each is followed by a nudge.
 void ScheduleDrain() {
-  while (python_api::TakesPendingCalls() &&
-         Py_AddPendingCall(&DrainMainThreadQueue, nullptr) != 0) {
+  while (interpreter::TakesPendingCalls()) {
+    const bool taken = Py_AddPendingCall(&DrainMainThreadQueue, nullptr) == 0;
+    interpreter::NudgeMainThread();
+    if (taken) return;
     std::this_thread::sleep_for(kRefusedRetryDelay);
   }
 }
 
 }  // namespace
 
-void InstallPendingCallPump() { platform::MessageQueue::ForCurrentThread()->SetWakeHandler(&ScheduleDrain); }
+void InstallPendingCallPump() {
+  interpreter::PrepareMainThreadNudge();
+  platform::MessageQueue::ForCurrentThread()->SetWakeHandler(&ScheduleDrain);
+}
 
 }  // namespace upload

@@ -50,7 +50,7 @@ PyMethodDef g_functions[] = {
 };
 
 PyObject* MakeModule() {
-  PyObject* module = python_api::CreateModule("_PyUploaderTestPeer", g_functions, kApiVersion);
+  PyObject* module = interpreter::CreateModule("_PyUploaderTestPeer", g_functions, kApiVersion);
   if (module) InitializeTypeTable(Types().table());
   return module;
 }

@@ -23,7 +23,7 @@ namespace test_support {
 // The test thread is the interpreter's main thread and holds its lock. The
 // interpreter stays up until the process ends, still reachable for leak checkers.
 inline void StartPython() {
-  if (!Py_IsInitialized()) python_api::StartHostedInterpreter();
+  if (!Py_IsInitialized()) interpreter::StartHostedInterpreter();
 }
 
 // The interpreter keeps objects in memory the leak checker cannot follow.

@@ -24,7 +24,7 @@ bool TakesSingleObject(PyObject* function) {
 }
 
 void SetConstructor(ClassData& data, PyObject* cls) {
-  data.newRaw = python_api::IsClassicClass(cls) ? nullptr : OptionalAttribute(cls, "__new__");
+  data.newRaw = interpreter::IsClassicClass(cls) ? nullptr : OptionalAttribute(cls, "__new__");
   if (data.newRaw) {
     data.newArgs = PyTuple_Pack(1, cls);
   } else {
@@ -75,7 +75,7 @@ bool StoreThis(PyObject* instance, PyObject* pointerObject) {
 PyObject* NewClassicInstance(const ClassData& data, PyObject* pointerObject) {
   PyRef dict(PyDict_New());
   if (!dict || PyDict_SetItem(dict.get(), ThisName(), pointerObject) != 0) return nullptr;
-  return python_api::NewClassicInstance(data.newArgs, dict.get());
+  return interpreter::NewClassicInstance(data.newArgs, dict.get());
 }
 
 }  // namespace

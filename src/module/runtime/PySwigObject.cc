@@ -70,18 +70,18 @@ PyObject* ReprSlot(PyObject* self) {
     if (object.next) {
       PyRef nextText(PyObject_Repr(object.next));  // its recursion limit guards long chains
       if (!nextText) return nullptr;
-      const char* nextChars = python_api::NarrowTextChars(nextText.get());
+      const char* nextChars = interpreter::NarrowTextChars(nextText.get());
       if (!nextChars) return nullptr;
       text += nextChars;
     }
-    return python_api::NewNarrowText(text.data(), text.size());
+    return interpreter::NewNarrowText(text.data(), text.size());
   });
 }
 
 int PrintSlot(PyObject* self, FILE* file, int) {
   PyRef text(ReprSlot(self));
   if (!text) return -1;
-  const char* chars = python_api::NarrowTextChars(text.get());
+  const char* chars = interpreter::NarrowTextChars(text.get());
   if (!chars) return -1;
   std::fputs(chars, file);
   return 0;
@@ -91,7 +91,7 @@ PyObject* StrSlot(PyObject* self) {
   return RaiseOnException<PyObject*>(nullptr, [self] {
     PySwigObject& object = *AsObject(self);
     std::string text = "_" + PackBytes(&object.ptr, sizeof object.ptr) + object.type->mangledName;
-    return python_api::NewNarrowText(text.data(), text.size());
+    return interpreter::NewNarrowText(text.data(), text.size());
   });
 }
 
@@ -105,7 +105,7 @@ PyObject* LongSlot(PyObject* self) { return PyLong_FromVoidPtr(AsObject(self)->p
 
 PyObject* FormattedAddress(PyObject* self, const char* format) {
   return RaiseOnException<PyObject*>(nullptr, [self, format] {
-    return python_api::NewNarrowText(FormatAddress(format, AsObject(self)->ptr).c_str());
+    return interpreter::NewNarrowText(FormatAddress(format, AsObject(self)->ptr).c_str());
   });
 }
 PyObject* OctSlot(PyObject* self) { return FormattedAddress(self, "%" PRIoPTR); }
@@ -123,7 +123,7 @@ PyObject* Acquire(PyObject* self, PyObject*) {
 
 PyObject* Own(PyObject* self, PyObject* args) {
   PyObject* value = nullptr;
-  if (!python_api::UnpackTuple(args, "own", 0, 1, &value)) return nullptr;
+  if (!interpreter::UnpackTuple(args, "own", 0, 1, &value)) return nullptr;
   PyObject* previous = PyBool_FromLong(AsObject(self)->own);
   if (value) {
     int truth = PyObject_IsTrue(value);
@@ -180,7 +180,7 @@ PyMethodDef kMethods[] = {
 
 PyNumberMethods MakeNumberMethods() {
   PyNumberMethods number{};
-  python_api::SetIntegerSlots(number, LongSlot, OctSlot, HexSlot);
+  interpreter::SetIntegerSlots(number, LongSlot, OctSlot, HexSlot);
   return number;
 }
 
@@ -188,8 +188,8 @@ PyTypeObject MakeType() {
   static PyNumberMethods number = MakeNumberMethods();
   PyTypeObject type = StaticType::Template(kTypeName, sizeof(PySwigObject));
   type.tp_dealloc = Dealloc;
-  python_api::SetPrintSlot(type, PrintSlot);
-  python_api::SetCompareSlot<CompareSlot>(type);
+  interpreter::SetPrintSlot(type, PrintSlot);
+  interpreter::SetCompareSlot<CompareSlot>(type);
   type.tp_repr = ReprSlot;
   type.tp_as_number = &number;
   type.tp_str = StrSlot;

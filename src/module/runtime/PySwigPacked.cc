@@ -36,7 +36,7 @@ std::string Repr(const PySwigPacked& packed) {
 PyObject* ReprSlot(PyObject* self) {
   return RaiseOnException<PyObject*>(nullptr, [self] {
     std::string text = Repr(*AsPacked(self));
-    return python_api::NewNarrowText(text.data(), text.size());
+    return interpreter::NewNarrowText(text.data(), text.size());
   });
 }
 
@@ -44,7 +44,7 @@ PyObject* StrSlot(PyObject* self) {
   return RaiseOnException<PyObject*>(nullptr, [self] {
     const PySwigPacked& packed = *AsPacked(self);
     std::string text = PackedForm(packed).value_or("") + packed.type->mangledName;
-    return python_api::NewNarrowText(text.data(), text.size());
+    return interpreter::NewNarrowText(text.data(), text.size());
   });
 }
 
@@ -71,8 +71,8 @@ void Dealloc(PyObject* self) {
 PyTypeObject MakeType() {
   PyTypeObject type = StaticType::Template(kTypeName, sizeof(PySwigPacked));
   type.tp_dealloc = Dealloc;
-  python_api::SetPrintSlot(type, PrintSlot);
-  python_api::SetCompareSlot<CompareSlot>(type);
+  interpreter::SetPrintSlot(type, PrintSlot);
+  interpreter::SetCompareSlot<CompareSlot>(type);
   type.tp_repr = ReprSlot;
   type.tp_str = StrSlot;
   return type;

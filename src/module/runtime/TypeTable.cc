@@ -23,7 +23,11 @@ TypeTable* g_moduleTable = nullptr;  // this module's own table
 TypeTable* g_ringHead = nullptr;     // the remembered answer of the ring lookup
 
 // Run when the interpreter destroys the ring module: the head table's classes go.
+// Not while the interpreter exits, which frees this module before the objects that
+// other modules' globals hold, and those need their classes' destructors; the
+// classes are then held until the process ends.
 void ReleaseRing(void* pointer) {
+  if (interpreter::TearingDownModules()) return;
   auto* head = static_cast<TypeTable*>(pointer);
   for (size_t i = 0; i < head->size; ++i) {
     TypeInfo* type = head->types[i];
@@ -35,16 +39,16 @@ void ReleaseRing(void* pointer) {
 TypeTable* LookUpRing() {
   if (!g_ringHead) {
     g_ringHead = static_cast<TypeTable*>(
-        python_api::ImportPublishedPointer(kRingModule, kRingAttribute, kRingCapsule));
+        interpreter::ImportPublishedPointer(kRingModule, kRingAttribute, kRingCapsule));
     if (!g_ringHead) PyErr_Clear();
   }
   return g_ringHead;
 }
 
 void CreateRing(TypeTable& head) {
-  PyObject* module = python_api::AddEmptyModule(kRingModule, kRingApiVersion);
+  PyObject* module = interpreter::AddEmptyModule(kRingModule, kRingApiVersion);
   if (!module) return;
-  PyObject* pointer = python_api::NewPublishedPointer(&head, kRingCapsule, ReleaseRing);
+  PyObject* pointer = interpreter::NewPublishedPointer(&head, kRingCapsule, ReleaseRing);
   if (pointer && PyModule_AddObject(module, kRingAttribute, pointer) == 0) g_ringHead = &head;
 }
 

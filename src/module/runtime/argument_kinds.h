@@ -74,7 +74,7 @@ ReferenceKind<T> Reference(TypeInfo* type, const char* cType) {
 // A `unicode` (or subclass) only, on 3 a `str`; on 2.7 the operation reads the
 // object's own buffer during the call, on 3 a copy.
 struct UnicodeKind : NeverSkips {
-  using Slot = python_api::UnicodeChars;
+  using Slot = interpreter::UnicodeChars;
   bool Convert(const char*, int, PyObject* object, Slot& slot) const {
     if (!PyUnicode_Check(object)) {
       PyErr_SetString(PyExc_TypeError, "Unicode string expected");

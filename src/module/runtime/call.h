@@ -49,7 +49,7 @@ PyObject* Run(std::index_sequence<I...>, PyObject* args, const char* function,
               const Result& result, Op& op, const Kinds&... kinds) {
   constexpr Py_ssize_t kCount = sizeof...(Kinds);
   std::array<PyObject*, kCount + 1> objects{};
-  if (!python_api::UnpackTuple(args, function, kCount, kCount, &objects[I]...)) return nullptr;
+  if (!interpreter::UnpackTuple(args, function, kCount, kCount, &objects[I]...)) return nullptr;
   std::tuple<typename Kinds::Slot...> slots;
   if (!(kinds.Convert(function, static_cast<int>(I) + 1, objects[I], std::get<I>(slots)) && ...)) {
     return nullptr;
@@ -81,7 +81,7 @@ PyObject* Delete(PyObject* args, const char* function, TypeInfo* type, const cha
 // A "_swigregister" function: registers its one argument as the class of `type`.
 inline PyObject* Register(PyObject* args, TypeInfo* type) {
   PyObject* cls = nullptr;
-  if (!python_api::UnpackTuple(args, "swigregister", 1, 1, &cls)) return nullptr;
+  if (!interpreter::UnpackTuple(args, "swigregister", 1, 1, &cls)) return nullptr;
   return RaiseOnException<PyObject*>(nullptr, [&] {
     RegisterClass(*type, cls);
     Py_RETURN_NONE;

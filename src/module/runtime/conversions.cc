@@ -27,9 +27,9 @@ TypeInfo* CharType() {
 }
 
 wchar_t* CopyUnicode(PyObject* text) {
-  Py_ssize_t count = python_api::UnicodeLength(text);
+  Py_ssize_t count = interpreter::UnicodeLength(text);
   auto* copy = new wchar_t[count + 1];
-  python_api::CopyUnicode(text, copy, count);
+  interpreter::CopyUnicode(text, copy, count);
   copy[count] = L'\0';
   return copy;
 }
@@ -45,7 +45,7 @@ bool InIntRange(long value) { return value >= INT_MIN && value <= INT_MAX; }
 
 int AsWideString(PyObject* object, wchar_t** address, size_t*, int* mark) {
   PyRef decoded;
-  if (python_api::IsUndecodedText(object)) {
+  if (interpreter::IsUndecodedText(object)) {
     decoded = PyRef(PyUnicode_FromObject(object));
     if (!decoded) return STATUS_TYPE_ERROR;
     object = decoded.get();
@@ -67,8 +67,8 @@ int AsWideString(PyObject* object, wchar_t** address, size_t*, int* mark) {
 }
 
 int AsNarrowString(PyObject* object, char** address, size_t* length, int* mark) {
-  if (python_api::IsNarrowText(object)) {
-    const python_api::NarrowBytes bytes(object);
+  if (interpreter::IsNarrowText(object)) {
+    const interpreter::NarrowBytes bytes(object);
     if (!bytes) return STATUS_TYPE_ERROR;
     size_t count = bytes.size() + 1;
     // Bytes that die with `bytes` are copied whatever the caller asked for.
@@ -107,8 +107,8 @@ int AsNarrowArray(PyObject* object, char* buffer, size_t size) {
 
 int AsInt(PyObject* object, int* value) {
   long number = 0;
-  if (python_api::IsShortInt(object)) {
-    number = python_api::ShortIntValue(object);
+  if (interpreter::IsShortInt(object)) {
+    number = interpreter::ShortIntValue(object);
   } else if (PyLong_Check(object)) {
     number = PyLong_AsLong(object);
     if (number == -1 && PyErr_Occurred()) {
@@ -125,7 +125,7 @@ int AsInt(PyObject* object, int* value) {
 }
 
 PyObject* FromNarrowArray(const char* bytes, size_t size) {
-  return python_api::NewNarrowText(bytes, size);
+  return interpreter::NewNarrowText(bytes, size);
 }
 
 size_t TrimTrailingZeros(const char* bytes, size_t size) {
@@ -157,7 +157,7 @@ PyObject* FromWideMap(const std::map<std::wstring, std::wstring>& items) {
 }
 
 PyObject* FromUnsigned(uint32_t value) {
-  if (value <= kLargestInt) return python_api::NewInt(static_cast<long>(value));
+  if (value <= kLargestInt) return interpreter::NewInt(static_cast<long>(value));
   return PyLong_FromUnsignedLong(value);
 }
 

@@ -36,7 +36,7 @@ int AsNarrowArray(PyObject* object, char* buffer, size_t size);
 int AsInt(PyObject* object, int* value);
 
 // A `str` of exactly `size` bytes (on 3 of their UTF-8 decoding, see
-// python_api::NewNarrowText).
+// interpreter::NewNarrowText).
 PyObject* FromNarrowArray(const char* bytes, size_t size);
 
 // The length of `bytes` without its trailing zero bytes.

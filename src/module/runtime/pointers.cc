@@ -17,8 +17,8 @@ constexpr int kMaxThisDepth = 64;
 
 // One step of the search: the value that `object` names as "this", or empty.
 PyRef LookUpThis(PyObject* object) {
-  if (python_api::IsClassicInstance(object)) {
-    return PyRef::Borrow(python_api::ClassicInstanceLookup(object, ThisName()));
+  if (interpreter::IsClassicInstance(object)) {
+    return PyRef::Borrow(interpreter::ClassicInstanceLookup(object, ThisName()));
   }
   if (PyObject** dictSlot = _PyObject_GetDictPtr(object)) {
     return PyRef::Borrow(*dictSlot ? PyDict_GetItem(*dictSlot, ThisName()) : nullptr);
@@ -50,7 +50,7 @@ PySwigObject* MatchInChain(PySwigObject* object, TypeInfo* expected, void** addr
 }  // namespace
 
 PyObject* ThisName() {
-  if (!g_thisName) g_thisName = python_api::NewInternedText("this");
+  if (!g_thisName) g_thisName = interpreter::NewInternedText("this");
   return g_thisName;
 }
 

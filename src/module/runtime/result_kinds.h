@@ -22,7 +22,7 @@ struct ReturnsNone {};
 
 // An `int` of the operation's 32-bit result.
 struct ReturnsInt {
-  PyObject* Make(int value) const { return python_api::NewInt(value); }
+  PyObject* Make(int value) const { return interpreter::NewInt(value); }
 };
 
 // An `int` below 0x80000000, else a `long`.

@@ -96,7 +96,7 @@ TEST(CallSequence, CopiesMadeBeforeARefusalOrAnExceptionAreFreed) {
     PyErr_Fetch(&type, &value, &traceback);
     PyRef held(type), message(value ? PyObject_Str(value) : nullptr), rest(value), trace(traceback);
     EXPECT_EQ(type, which == 0 ? PyExc_MemoryError : PyExc_RuntimeError);
-    EXPECT_EQ(message ? python_api::NarrowTextChars(message.get()) : "", text);
+    EXPECT_EQ(message ? interpreter::NarrowTextChars(message.get()) : "", text);
   }
   Type("_p_Thing");
   PyRef args(Py_BuildValue("(us)", L"copied copied copied copied copied", "not an int"));
@@ -113,8 +113,8 @@ TEST(ResultKinds, WideTextsBecomeUnicodeWithEveryCharacter) {
   const std::wstring text(L"m\u00E4\0t\U0001F600", 5);
   PyRef made(FromWide(text));
   ASSERT_TRUE(made && PyUnicode_CheckExact(made.get()));
-  std::wstring chars(python_api::UnicodeLength(made.get()), L'\0');
-  python_api::CopyUnicode(made.get(), chars.data(), chars.size());
+  std::wstring chars(interpreter::UnicodeLength(made.get()), L'\0');
+  interpreter::CopyUnicode(made.get(), chars.data(), chars.size());
   EXPECT_EQ(chars, text);
 }
 
